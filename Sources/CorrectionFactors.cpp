@@ -1,0 +1,183 @@
+// Correction factors: direct searches that fit the free parameters of the two
+// four-colour models to measured control patches by CIELAB colour difference
+// (CIE 1976 dE*ab).
+//
+// Offset: grayDiffFactor (C, M, Y, K) and coverageLimit are fitted so that the
+// model reproduces the three-colour grey C40 M40 Y40 (form row 44) and the
+// four-colour grey C40 M40 Y40 K40 (row 45):
+//     score = sqrt(dE(grey3)^2 + dE(grey4)^2).
+// Gravure: the ink order and rgbFactor are fitted to the red, green and blue
+// two-ink solids (rows 6, 8, 28).
+//
+// Every search compares strictly (a candidate wins only when the best so far
+// is greater), so ties go to the candidate met first; best scores start at 10000.
+#include "MathProfile.h"
+
+#include <cmath>
+#include <cstring>
+
+namespace {
+
+const double kNoScore = 10000.0;
+
+// A search point of the grey fit: the four factors in hundredths, then the
+// coverage limit in percent.
+struct GrayPoint {
+    int p[5];
+};
+enum { kPC, kPM, kPY, kPK, kPL };
+
+} // namespace
+
+void MathProfile::calculateGrayDiffFactor(double** rows)
+{
+    readData(rows);
+    for (int list = 0; list < 4; ++list)
+        sortData(tintLists[list]);
+
+    auto measuredLab = [this](const double* row) {
+        ColorPatch patch = {};
+        std::memcpy(patch.spectrum, row, sizeof patch.spectrum);
+        spec2XYZ(&patch);
+        return labOf(patch);
+    };
+    // Rows 44 and 45 are read after readData, which may have exchanged rows.
+    const lab grey3 = measuredLab(rows[44]);
+    const lab grey4 = measuredLab(rows[45]);
+
+    auto setFields = [this](const GrayPoint& point) {
+        for (int x = 0; x < 4; ++x)
+            grayDiffFactor[x] = point.p[x] / 100.0;
+        coverageLimit = point.p[kPL];
+    };
+    const ColorPatch& sample = patchSlots[kSlotCurrentSample];
+    auto score = [&](const GrayPoint& point) {
+        setFields(point);
+        setSample(40.0, 40.0, 40.0, 0.0, 0.0, 0.0, 0.0);
+        calcOffsetSample();
+        const double dE3 = deltaE(grey3, labOf(sample));
+        setSample(40.0, 40.0, 40.0, 40.0, 0.0, 0.0, 0.0);
+        calcOffsetSample();
+        const double dE4 = deltaE(grey4, labOf(sample));
+        return std::sqrt(dE3 * dE3 + dE4 * dE4);
+    };
+
+    // Coarse grid, limit outermost and black innermost: 3 x 16 x 16 x 21 x 26 points.
+    double best = kNoScore;
+    GrayPoint current = {{0, 0, 0, 0, 0}};
+    bool found = false;
+    GrayPoint point;
+    for (point.p[kPL] = 100; point.p[kPL] <= 300; point.p[kPL] += 100)
+        for (point.p[kPC] = -100; point.p[kPC] <= 50; point.p[kPC] += 10)
+            for (point.p[kPM] = -100; point.p[kPM] <= 50; point.p[kPM] += 10)
+                for (point.p[kPY] = 0; point.p[kPY] <= 200; point.p[kPY] += 10)
+                    for (point.p[kPK] = -200; point.p[kPK] <= 50; point.p[kPK] += 10) {
+                        const double s = score(point);
+                        if (best > s) {
+                            best = s;
+                            current = point;
+                            found = true;
+                        }
+                    }
+    if (!found) {
+        // Non-finite measurements: no point scores at all. Keep the
+        // uncorrected model rather than a zero coverage limit.
+        for (double& factor : grayDiffFactor)
+            factor = 0.0;
+        coverageLimit = 200.0;
+        return;
+    }
+    setFields(current);
+
+    // Fine search: greedy coordinate moves with a shrinking step. A move is
+    // tried only when the value before it is inside its bound, so a factor can
+    // end up to 0.09 beyond +-10 and the limit between 91 and 407.
+    struct Move {
+        int coordinate, sign, bound;
+    };
+    const Move moves[10] = {{kPC, +1, 1000}, {kPM, +1, 1000}, {kPY, +1, 1000}, {kPK, +1, 1000}, {kPL, +1, 398},
+                            {kPC, -1, -1000}, {kPM, -1, -1000}, {kPY, -1, -1000}, {kPK, -1, -1000}, {kPL, -1, 100}};
+    for (int step = 9; step >= 1; --step) {
+        double passStart;
+        do {
+            passStart = best;
+            for (const Move& move : moves) {
+                const int value = current.p[move.coordinate];
+                if (move.sign > 0 ? value > move.bound : value < move.bound)
+                    continue;
+                GrayPoint moved = current;
+                moved.p[move.coordinate] = value + move.sign * step;
+                const double s = score(moved);
+                if (best > s) {
+                    best = s;
+                    current = moved;
+                }
+            }
+        } while (best < passStart);
+        setFields(current);
+    }
+}
+
+void MathProfile::calculateRGBFactors(double** rows)
+{
+    readData(rows);
+    for (int list = 0; list < 4; ++list)
+        sortData(tintLists[list]);
+
+    // Red, green and blue two-ink solids and their measured colours.
+    const double requests[3][4] = {{0, 100, 100, 0}, {100, 0, 100, 0}, {100, 100, 0, 0}};
+    const int measuredRow[3] = {6, 8, 28};
+    lab reference[3];
+    for (int p = 0; p < 3; ++p) {
+        ColorPatch patch = {};
+        std::memcpy(patch.spectrum, rows[measuredRow[p]], sizeof patch.spectrum);
+        spec2XYZ(&patch);
+        reference[p] = labOf(patch);
+    }
+
+    const ColorPatch& sample = patchSlots[kSlotCurrentSample];
+    // Colour differences of red, green and blue predicted with an ink order.
+    auto differences = [&](int order, double dE[3]) {
+        for (int p = 0; p < 3; ++p) {
+            setSample(requests[p][0], requests[p][1], requests[p][2], requests[p][3], 0.0, 0.0, 0.0);
+            calcGravureSampleByOrder(order);
+            dE[p] = deltaE(reference[p], labOf(sample));
+        }
+    };
+
+    double best = kNoScore;
+    int bestOrder = 0;
+    for (int order = 0; order <= 4; ++order) {
+        double dE[3];
+        differences(order, dE);
+        const double s = dE[0] + dE[1] + dE[2];
+        if (best > s) {
+            best = s;
+            bestOrder = order;
+        }
+    }
+    inkOrder = bestOrder;
+
+    for (int j = 0; j < 3; ++j) {
+        best = kNoScore;
+        double bestValue = 0.0;
+        for (int v = 100; v >= 2; --v) {
+            rgbFactor[j] = v / 100.0;
+            double dE[3];
+            differences(inkOrder, dE);
+            // The first factor search scores the plain sum, like the order
+            // search. The second and third score
+            //     sqrt(sqrt(dEr^2 + dEg^2) + dEb^2)
+            // a deliberate compatibility choice: it is 0 when all three match
+            // and grows with each difference, and it keeps the fitted factors,
+            // and so the charts, identical to those hosts already hold.
+            const double s = j == 0 ? dE[0] + dE[1] + dE[2]
+                                    : std::sqrt(std::sqrt(dE[0] * dE[0] + dE[1] * dE[1]) + dE[2] * dE[2]);
+            if (best > s) {
+                best = s;
+                bestValue = v / 100.0;
+            }
+        }
+        rgbFactor[j] = bestValue;
+    }
+}

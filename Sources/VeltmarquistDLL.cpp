@@ -1,0 +1,281 @@
+// The library's entry points and the life of a profile.
+//
+// CalculateChart turns the host's integers (reflectance x 1000) into one
+// 36-band row per patch, 380 to 730 nm, runs the calculation that the process
+// selects, and turns every exception into a status: no exception crosses the
+// C boundary.
+#include "MathProfile.h"
+#include "ScratchAllocation.h"
+#include "VeltmarquistDLL.h"
+
+#include <algorithm>
+#include <cstdlib>
+#include <cstring>
+#include <new>
+
+// ---- Profile object --------------------------------------------------------
+
+MathProfile::MathProfile(const char* name)
+{
+    std::memset(patchSlots, 0, sizeof patchSlots);
+    inkOrder = 2;
+    rgbFactor[0] = 0.9;
+    rgbFactor[1] = 0.85;
+    rgbFactor[2] = 0.85;
+    // Summed from 380 nm upward: 99.94200000000001, so normFactor is
+    // 1.0005803365952251 and a perfect white gets Y = 100 up to rounding.
+    double sum = 0.0;
+    for (const auto& weights : Gewichtsfaktoren_XYZ_D50)
+        sum += weights[1];
+    normFactor = 100.0 / sum;
+    for (double& factor : grayDiffFactor)
+        factor = 0.0;
+    coverageLimit = 200.0;
+    // Longer names are cut to the 1023 characters that fit.
+    std::memset(profileName, 0, sizeof profileName);
+    if (name != nullptr)
+        std::strncpy(profileName, name, sizeof profileName - 1);
+}
+
+MathProfile::~MathProfile() = default;
+
+double MathProfile::InterpolateSpectralValue(int band, double* values)
+{
+    // 16 values at 400, 420, ..., 700 nm. 380-410 nm take the 420 nm value
+    // (values[0] is never used), 710-730 nm the 700 nm value; odd positions
+    // in between the mean of their neighbours.
+    if (band < 4)
+        return values[1];
+    if (band >= 33)
+        return values[15];
+    const int h = band / 2;
+    if (band % 2 == 0)
+        return values[h - 1];
+    return (values[h - 1] + values[h]) * 0.5;
+}
+
+// ---- Scratch buffers ---------------------------------------------------------
+
+namespace scratch {
+namespace {
+Allocator currentAllocator = nullptr;
+}
+
+Allocator setAllocator(Allocator allocator)
+{
+    const Allocator previous = currentAllocator;
+    currentAllocator = allocator;
+    return previous;
+}
+
+void* allocate(std::size_t count, std::size_t size)
+{
+    return currentAllocator != nullptr ? currentAllocator(count, size) : std::calloc(count, size);
+}
+
+void release(void* buffer)
+{
+    std::free(buffer);
+}
+} // namespace scratch
+
+namespace {
+
+const int kMaxPatches = 1999;
+const int kRowTableSize = 2000;
+const int kPatchStride = 100;
+
+// The buffers of one call, released on every path.
+struct CallBuffers {
+    double* channelMatrix = nullptr;
+    double* rows[kRowTableSize] = {};
+    double* patchMatrix = nullptr;
+
+    ~CallBuffers()
+    {
+        scratch::release(channelMatrix);
+        for (double* row : rows)
+            scratch::release(row);
+        scratch::release(patchMatrix);
+    }
+};
+
+// Patches the calculation of `process` reads.
+int patchesRead(int process)
+{
+    switch (process) {
+    case VM_PROCESS_SIX_COLOUR: return 10;
+    case VM_PROCESS_SEVEN_COLOUR: return 11;
+    case VM_PROCESS_SEPARATED_SET: return 1;
+    case VM_PROCESS_CHART_COPY:
+    case VM_PROCESS_CHART_CONVERT:
+    case VM_PROCESS_CHART_BLEND: return 2; // the two reference whites
+    default: return 46;                    // the four-colour test form
+    }
+}
+
+// Band placement of kind-10 input: d = F / 10 - 38 bands lie below 380 nm
+// (or, for F > 380, missing in front of the first measured band).
+struct Placement {
+    int offset; // min(|d|, 99)
+    int copied; // min(N - |d|, 36): bands that land at their own wavelength
+};
+
+Placement placementOf(int firstWavelength, int valuesPerPatch)
+{
+    const int s = std::abs(firstWavelength / 10 - 38);
+    return Placement{std::min(s, 99), std::min(valuesPerPatch - s, 36)};
+}
+
+bool measurementBlockValid(const MathProfile* profile, PrintProcess process, const char* path,
+                           const int* measurements, int inputKind, int firstWavelength, int valuesPerPatch,
+                           int count)
+{
+    if (profile == nullptr || path == nullptr || measurements == nullptr)
+        return false;
+    if (count > kMaxPatches || count < patchesRead(process))
+        return false;
+    if (inputKind == VM_INPUT_16BAND)
+        return valuesPerPatch == 16;
+    if (valuesPerPatch < 1 || valuesPerPatch > kPatchStride)
+        return false;
+    if (firstWavelength > 380 && (firstWavelength > 740 || valuesPerPatch > 36))
+        return false;
+    if (placementOf(firstWavelength, valuesPerPatch).copied < 1)
+        return false;
+    if (process == VM_PROCESS_SEPARATED_SET)
+        for (const auto& list : profile->tintLists)
+            if (list.empty())
+                return false; // no tone ramps of a preceding process 3 or 5
+    return true;
+}
+
+// Places the bands of one converted patch (100 doubles) into its 36-band row.
+void placeBands(const double* p, double* row, int firstWavelength, int valuesPerPatch, Placement placement)
+{
+    if (firstWavelength <= 380) {
+        // Bands below 380 nm are skipped; positions past the last band keep 0.
+        for (int j = 0; j < placement.copied; ++j)
+            row[j] = p[placement.offset + j];
+        return;
+    }
+    // The first band starts above 380 nm: positions in front of it repeat the
+    // first value, positions past the last band repeat the last value, then
+    // the measured bands are copied.
+    const int n = std::min(valuesPerPatch, 100);
+    for (int j = 0; j < placement.offset; ++j)
+        row[j] = p[0];
+    if (n <= 35 && valuesPerPatch - placement.offset <= 35)
+        for (int j = n; j < 36; ++j)
+            row[j] = p[n - 1];
+    for (int j = 0; j < placement.copied; ++j)
+        row[placement.offset + j] = p[j];
+}
+
+int runCalculation(MathProfile* profile, PrintProcess process, const char* path, int* measurements,
+                   int inputKind, int firstWavelength, int valuesPerPatch, int count)
+{
+    CallBuffers buffers;
+    buffers.channelMatrix = static_cast<double*>(scratch::allocate(static_cast<size_t>(count) * 7, sizeof(double)));
+    if (buffers.channelMatrix == nullptr)
+        return VM_STATUS_OUT_OF_MEMORY;
+    for (int i = 0; i < count; ++i) {
+        buffers.rows[i] = static_cast<double*>(scratch::allocate(MathProfile::kBands, sizeof(double)));
+        if (buffers.rows[i] == nullptr)
+            return VM_STATUS_OUT_OF_MEMORY;
+    }
+    buffers.patchMatrix =
+        static_cast<double*>(scratch::allocate(static_cast<size_t>(count) * kPatchStride, sizeof(double)));
+    if (buffers.patchMatrix == nullptr)
+        return VM_STATUS_OUT_OF_MEMORY;
+
+    // Convert to reflectance factors (0..1).
+    if (inputKind == VM_INPUT_10NM) {
+        for (int i = 0; i < count; ++i)
+            for (int j = 0; j < valuesPerPatch; ++j)
+                buffers.patchMatrix[i * kPatchStride + j] = measurements[i * valuesPerPatch + j] / 1000.0;
+    } else {
+        double sixteen[16] = {};
+        for (int i = 0; i < count; ++i) {
+            for (int j = 0; j < valuesPerPatch; ++j)
+                sixteen[j] = measurements[i * valuesPerPatch + j] / 1000.0;
+            for (int b = 0; b < MathProfile::kBands; ++b)
+                buffers.patchMatrix[i * kPatchStride + b] = profile->InterpolateSpectralValue(b, sixteen);
+        }
+        firstWavelength = 380;
+        valuesPerPatch = 36;
+    }
+    const Placement placement = placementOf(firstWavelength, valuesPerPatch);
+    for (int i = 0; i < count; ++i)
+        placeBands(buffers.patchMatrix + i * kPatchStride, buffers.rows[i], firstWavelength, valuesPerPatch,
+                   placement);
+
+    if (process == VM_PROCESS_CHART_COPY || process == VM_PROCESS_CHART_CONVERT || process == VM_PROCESS_CHART_BLEND)
+        for (int i = 0; i < count; ++i)
+            for (int k = 0; k < 7; ++k)
+                buffers.channelMatrix[7 * i + k] = measurements[count * valuesPerPatch + 7 * i + k];
+
+    switch (process) {
+    case VM_PROCESS_GRAVURE:
+        profile->calculateChart(buffers.rows, VM_PROCESS_GRAVURE, path);
+        break;
+    case VM_PROCESS_SIX_COLOUR:
+    case VM_PROCESS_SEVEN_COLOUR:
+    case VM_PROCESS_SEPARATED_SET:
+        profile->calculateChartMCH(buffers.rows, process, path, measurements);
+        break;
+    case VM_PROCESS_CHART_COPY:
+    case VM_PROCESS_CHART_CONVERT:
+    case VM_PROCESS_CHART_BLEND:
+        profile->convertChart(buffers.rows, count, path, buffers.channelMatrix, process);
+        break;
+    default: // 0, 2, 4 and every value outside 0..9
+        profile->calculateGrayDiffFactor(buffers.rows);
+        profile->calculateChart(buffers.rows, VM_PROCESS_OFFSET, path);
+        break;
+    }
+    return VM_STATUS_OK;
+}
+
+} // namespace
+
+// ---- Entry points --------------------------------------------------------------
+
+extern "C" {
+
+void* CreateMathProfile(const char* name)
+{
+    try {
+        return new MathProfile(name);
+    } catch (...) {
+        return nullptr;
+    }
+}
+
+int CalculateChart(void* profile, PrintProcess process, const char* path, int* measurements, int inputKind,
+                   int firstWavelength, int valuesPerPatch, int count)
+{
+    if (inputKind != VM_INPUT_10NM && inputKind != VM_INPUT_16BAND)
+        return VM_STATUS_UNKNOWN_INPUT_KIND;
+    MathProfile* object = static_cast<MathProfile*>(profile);
+    if (!measurementBlockValid(object, process, path, measurements, inputKind, firstWavelength, valuesPerPatch,
+                               count))
+        return VM_STATUS_INVALID_MEASUREMENTS;
+    try {
+        return runCalculation(object, process, path, measurements, inputKind, firstWavelength, valuesPerPatch,
+                              count);
+    } catch (const Exceptions& failure) {
+        delete object;
+        return failure.code;
+    } catch (...) {
+        delete object;
+        return VM_STATUS_CALCULATION_FAILED;
+    }
+}
+
+void DestroyMathProfile(void* profile)
+{
+    delete static_cast<MathProfile*>(profile);
+}
+
+} // extern "C"

@@ -1,0 +1,132 @@
+/*
+ * VeltmarquistDLL - spectral print models and characterisation charts.
+ *
+ * The C interface of the library. A host creates one profile, runs one or more
+ * calculations on it and destroys it:
+ *
+ *     void *profile = CreateMathProfile("press 4, coated");
+ *     int status = CalculateChart(profile, VM_PROCESS_OFFSET, "chart.txt",
+ *                                 measurements, VM_INPUT_10NM, 380, 36, 46);
+ *     if (status == VM_STATUS_OK || status == VM_STATUS_UNKNOWN_INPUT_KIND ||
+ *         status == VM_STATUS_INVALID_MEASUREMENTS ||
+ *         status == VM_STATUS_OUT_OF_MEMORY)
+ *         DestroyMathProfile(profile);   // otherwise the library already did
+ *
+ * Measurements are integers: reflectance factor x 1000 (1000 = perfect white),
+ * patch after patch. The library writes the chart file at `path` and, for the
+ * six- and seven-colour processes, integers back into the measurement block.
+ *
+ * Valid C (C89 and later) and C++; no exception ever leaves these functions.
+ */
+#ifndef VELTMARQUIST_DLL_H
+#define VELTMARQUIST_DLL_H
+
+/* ---- Export macro --------------------------------------------------------
+ * VELTMARQUIST_BUILD is defined only while the library itself is compiled. */
+#if defined(_WIN32) || defined(__CYGWIN__)
+#  if defined(VELTMARQUIST_BUILD)
+#    define VELTMARQUIST_API __declspec(dllexport)
+#  else
+#    define VELTMARQUIST_API __declspec(dllimport)
+#  endif
+#elif defined(__GNUC__) || defined(__clang__)
+#  define VELTMARQUIST_API __attribute__((visibility("default")))
+#else
+#  define VELTMARQUIST_API
+#endif
+
+#ifdef __cplusplus
+extern "C" {
+#endif
+
+/* ---- Print processes ------------------------------------------------------
+ * Passed as a plain int. Every value not listed (2, 4, -1, 10, ...) runs the
+ * same calculation as VM_PROCESS_OFFSET.                                     */
+typedef enum PrintProcess {
+    VM_PROCESS_OFFSET = 0,        /* fit the offset model to the greys, write the 900-patch XYZ chart */
+    VM_PROCESS_GRAVURE = 1,       /* 900-patch XYZ chart from the gravure model                      */
+    VM_PROCESS_SIX_COLOUR = 3,    /* six-colour spectral chart (128 patches), fills the exchange buffer */
+    VM_PROCESS_SEVEN_COLOUR = 5,  /* seven-colour spectral chart (159 patches), fills the buffer        */
+    VM_PROCESS_SEPARATED_SET = 6, /* XYZ chart of the host's separations of the 3499 combinations       */
+    VM_PROCESS_CHART_COPY = 7,    /* measured chart written unchanged as a spectral chart              */
+    VM_PROCESS_CHART_CONVERT = 8, /* chart converted from the first reference white to the second      */
+    VM_PROCESS_CHART_BLEND = 9,   /* blend of converted and measured chart, weighted by the whites' dE */
+    /* Keep the enumeration as wide as int, so that any int is a valid value. */
+    VM_PROCESS_INT_MIN_ = -2147483647 - 1,
+    VM_PROCESS_INT_MAX_ = 2147483647
+} PrintProcess;
+
+/* ---- Input kinds ---------------------------------------------------------- */
+enum {
+    VM_INPUT_10NM = 10,  /* valuesPerPatch bands (1 to 100) in 10 nm steps from firstWavelength */
+    VM_INPUT_16BAND = 20 /* 16 bands, 400 to 700 nm in 20 nm steps; firstWavelength unused      */
+};
+
+/* ---- Status codes returned by CalculateChart -------------------------------
+ *
+ *  code  name                            meaning                                   profile afterwards
+ *  ----  ------------------------------  ----------------------------------------  ------------------
+ *  0     VM_STATUS_OK                    chart written                             alive
+ *  1     VM_STATUS_FILE_NOT_OPENED       chart file could not be opened            destroyed
+ *  2     VM_STATUS_UNKNOWN_INPUT_KIND    inputKind is neither 10 nor 20            alive
+ *  3     VM_STATUS_CALCULATION_FAILED    the calculation failed (an exception)     destroyed
+ *  4     VM_STATUS_INVALID_MEASUREMENTS  invalid measurement block (see below)     alive
+ *  5     VM_STATUS_OUT_OF_MEMORY         a scratch buffer could not be allocated   alive
+ *
+ * Status 2 is checked first, then status 4; statuses 2, 4 and 5 write no file.
+ * Status 4 (nothing allocated, nothing written) is returned for:
+ *  - a null profile, path or measurements pointer;
+ *  - count above 1999, or below what the process reads: 46 for processes 0,
+ *    1 and every value that runs as 0; 10 for 3; 11 for 5; 1 for 6; 2 for 7-9;
+ *  - kind 10 with valuesPerPatch outside 1 to 100; with firstWavelength above
+ *    380 and (firstWavelength above 740 or more than 36 values per patch); or
+ *    with a band layout that places no measured band at its own wavelength
+ *    between 380 and 730 nm (for example every band below 380 nm);
+ *  - kind 20 with valuesPerPatch other than 16;
+ *  - process 6 on a profile that holds no tone ramps of a preceding process
+ *    3 or 5 (one of its seven tint lists is empty).
+ * Write errors after the file was opened are not detected (status 0).       */
+enum {
+    VM_STATUS_OK = 0,
+    VM_STATUS_FILE_NOT_OPENED = 1,
+    VM_STATUS_UNKNOWN_INPUT_KIND = 2,
+    VM_STATUS_CALCULATION_FAILED = 3,
+    VM_STATUS_INVALID_MEASUREMENTS = 4,
+    VM_STATUS_OUT_OF_MEMORY = 5
+};
+
+/* Number of ints that the measurement block of processes 3, 5 and 6 must hold:
+ * 3499 exchange records of seven ints. The library cannot check the length of
+ * the host's buffer; a shorter buffer is overrun.                            */
+#define VM_EXCHANGE_RECORDS 3499
+#define VM_EXCHANGE_BUFFER_INTS 24493
+
+/* ---- Version --------------------------------------------------------------- */
+VELTMARQUIST_API extern const char VeltmarquistDLLVersionString[];
+VELTMARQUIST_API extern const double VeltmarquistDLLVersionNumber;
+
+/* ---- Entry points ---------------------------------------------------------- */
+
+/* Creates a profile named `name` (may be null; names longer than 1023
+ * characters are cut to 1023). Returns null when it cannot be created.       */
+VELTMARQUIST_API void *CreateMathProfile(const char *name);
+
+/* Runs one calculation on `profile` and writes its chart to `path`.
+ * measurements: count patches of valuesPerPatch ints (reflectance x 1000);
+ *   processes 7-9 read 7 channel values per patch (percent) behind them;
+ *   processes 3, 5 and 6 use the block as the exchange buffer and need
+ *   VM_EXCHANGE_BUFFER_INTS writable ints.
+ * Returns a VM_STATUS_* code. After status 1 or 3 the profile is destroyed
+ * and must be neither used nor destroyed again.                              */
+VELTMARQUIST_API int CalculateChart(void *profile, PrintProcess process, const char *path,
+                                    int *measurements, int inputKind, int firstWavelength,
+                                    int valuesPerPatch, int count);
+
+/* Destroys a profile; does nothing for null.                                 */
+VELTMARQUIST_API void DestroyMathProfile(void *profile);
+
+#ifdef __cplusplus
+}
+#endif
+
+#endif /* VELTMARQUIST_DLL_H */
