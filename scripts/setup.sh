@@ -1,0 +1,21 @@
+#!/usr/bin/env bash
+# Installs what building, testing and running need on a fresh Debian machine.
+# Packages already present are left alone; run as root (or with sudo available).
+set -euo pipefail
+
+packages=(build-essential cmake ninja-build pkg-config
+          libgtest-dev libgmock-dev libbenchmark-dev
+          liblcms2-dev libcli11-dev
+          clang libclang-rt-14-dev valgrind python3)
+
+missing=()
+for package in "${packages[@]}"; do
+  dpkg -s "$package" >/dev/null 2>&1 || missing+=("$package")
+done
+if ((${#missing[@]})); then
+  echo "setup: installing ${missing[*]}"
+  sudo=""
+  [ "$(id -u)" -eq 0 ] || sudo="sudo"
+  $sudo apt-get update -qq
+  DEBIAN_FRONTEND=noninteractive $sudo apt-get install -y -qq "${missing[@]}" >/dev/null
+fi
