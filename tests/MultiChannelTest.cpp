@@ -1,0 +1,292 @@
+// Six- and seven-colour processes: tone ramps, the seven-ink predictions, the
+// patch tables and the two-call exchange with the host.
+#include "TestSupport.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstring>
+#include <sstream>
+
+using namespace testsupport;
+
+namespace {
+
+template <size_t N>
+std::vector<int> asInts(const std::array<unsigned char, N>& row)
+{
+    return std::vector<int>(row.begin(), row.end());
+}
+
+// A profile with paper and seven solids in place and its ramps built.
+class RampProfile : public ::testing::Test {
+protected:
+    void SetUp() override
+    {
+        for (int j = 0; j < 36; ++j) {
+            profile.patchSlots[13].spectrum[j] = 0.9;
+            for (int c = 0; c < 7; ++c)
+                profile.patchSlots[14 + c].spectrum[j] = 0.1 + 0.02 * c + 0.005 * (j % 5);
+        }
+        std::memcpy(solids, profile.patchSlots + 14, sizeof solids);
+        profile.buildTintRamps();
+    }
+    const MathProfile::ColorPatch& sample() const { return profile.patchSlots[21]; }
+
+    MathProfile profile{"ramps"};
+    MathProfile::ColorPatch solids[7];
+};
+
+void loadSeparations(std::vector<int>& buffer)
+{
+    std::istringstream in(readFile(goldenPath("multichannel.separations")));
+    for (int i = 0; i < VM_EXCHANGE_BUFFER_INTS; ++i)
+        in >> buffer[static_cast<size_t>(i)];
+    ASSERT_TRUE(in) << "3499 records of seven ints";
+}
+
+int calculate(void* profile, int process, const std::string& path, MeasurementBlock& block)
+{
+    return CalculateChart(profile, static_cast<PrintProcess>(process), path.c_str(), block.ints.data(),
+                          block.inputKind, block.firstWavelength, block.valuesPerPatch, block.count);
+}
+
+} // namespace
+
+TEST(PatchSets, ChannelChartTellingRows)
+{
+    const auto& clr7 = MathProfile::toBeCalculatedCLR7;
+    ASSERT_EQ(clr7.size(), 169u);
+    EXPECT_EQ(asInts(clr7[0]), (std::vector<int>{100, 0, 0, 0, 0, 0, 0}));
+    EXPECT_EQ(asInts(clr7[11]), (std::vector<int>{0, 0, 0, 0, 0, 0, 100}));
+    EXPECT_EQ(asInts(clr7[33]), (std::vector<int>{0, 0, 0, 0, 100, 0, 0}));
+    EXPECT_EQ(asInts(clr7[66]), (std::vector<int>{0, 100, 0, 0, 0, 0, 0}));
+    EXPECT_EQ(asInts(clr7[77]), (std::vector<int>{100, 100, 0, 0, 0, 0, 0}));
+    EXPECT_EQ(asInts(clr7[101]), (std::vector<int>{100, 0, 100, 0, 0, 0, 0}));
+    EXPECT_EQ(asInts(clr7[102]), (std::vector<int>{0, 0, 0, 100, 0, 0, 0}));
+    EXPECT_EQ(asInts(clr7[108]), (std::vector<int>{100, 0, 0, 0, 0, 0, 100}));
+    EXPECT_EQ(asInts(clr7[158]), (std::vector<int>{0, 0, 0, 0, 50, 50, 50}));
+    EXPECT_EQ(asInts(clr7[168]), (std::vector<int>{0, 0, 0, 0, 0, 0, 0}));
+
+    const auto& clr6 = MathProfile::toBeCalculatedCLR6;
+    ASSERT_EQ(clr6.size(), 138u);
+    EXPECT_EQ(asInts(clr6[22]), (std::vector<int>{0, 0, 0, 0, 100, 0}));
+    EXPECT_EQ(asInts(clr6[91]), (std::vector<int>{0, 0, 0, 100, 0, 0}));
+    EXPECT_EQ(asInts(clr6[106]), (std::vector<int>{0, 0, 0, 0, 100, 100}));
+    EXPECT_EQ(asInts(clr6[127]), (std::vector<int>{50, 50, 50, 50, 0, 0}));
+    EXPECT_EQ(asInts(clr6[128]), (std::vector<int>{0, 0, 0, 90, 0, 0}));
+
+    int paper6 = 0, paper7 = 0;
+    for (size_t r = 0; r < 128; ++r)
+        paper6 += asInts(clr6[r]) == std::vector<int>(6, 0);
+    for (size_t r = 0; r < 159; ++r)
+        paper7 += asInts(clr7[r]) == std::vector<int>(7, 0);
+    EXPECT_EQ(paper6, 5);
+    EXPECT_EQ(paper7, 6);
+}
+
+TEST(PatchSets, ExtendedSetIsTheSortedUnion)
+{
+    const auto& zan = MathProfile::ZANExtended;
+    ASSERT_EQ(zan.size(), 3500u);
+    for (size_t i = 1; i < 3499; ++i)
+        EXPECT_LT(zan[i - 1], zan[i]) << "strictly increasing at " << i;
+    EXPECT_EQ(asInts(zan[0]), (std::vector<int>{0, 0, 0, 0}));
+    EXPECT_EQ(asInts(zan[1]), (std::vector<int>{0, 0, 0, 2}));
+    EXPECT_EQ(asInts(zan[20]), (std::vector<int>{0, 0, 0, 100}));
+    EXPECT_EQ(asInts(zan[21]), (std::vector<int>{0, 0, 2, 0}));
+    EXPECT_EQ(asInts(zan[491]), (std::vector<int>{0, 100, 100, 100}));
+    EXPECT_EQ(asInts(zan[492]), (std::vector<int>{2, 0, 0, 0}));
+    EXPECT_EQ(asInts(zan[493]), (std::vector<int>{3, 0, 0, 0}));
+    EXPECT_EQ(asInts(zan[1000]), (std::vector<int>{20, 10, 70, 20}));
+    EXPECT_EQ(asInts(zan[2000]), (std::vector<int>{50, 30, 100, 0}));
+    EXPECT_EQ(asInts(zan[3000]), (std::vector<int>{90, 60, 50, 0}));
+    EXPECT_EQ(asInts(zan[3498]), (std::vector<int>{100, 100, 100, 100}));
+    EXPECT_EQ(asInts(zan[3499]), (std::vector<int>{0, 0, 0, 0}));
+}
+
+TEST_F(RampProfile, RampsInterpolateInTheCubeRootDomain)
+{
+    for (int c = 0; c < 7; ++c) {
+        const auto& ramp = profile.tintLists[c];
+        ASSERT_EQ(ramp.size(), 101u);
+        for (int i = 0; i <= 100; ++i) {
+            EXPECT_EQ(ramp[static_cast<size_t>(i)].channel[c], i);
+            for (int k = 0; k < 7; ++k)
+                if (k != c) {
+                    EXPECT_EQ(ramp[static_cast<size_t>(i)].channel[k], 0.0);
+                }
+        }
+        for (int j = 0; j < 36; ++j) {
+            EXPECT_NEAR(ramp[0].spectrum[j], 0.9, 1e-15);
+            EXPECT_NEAR(ramp[100].spectrum[j], solids[c].spectrum[j], 1e-15);
+            const double mid = (std::cbrt(0.9) + std::cbrt(solids[c].spectrum[j])) / 2;
+            EXPECT_NEAR(ramp[50].spectrum[j], mid * mid * mid, 1e-15);
+        }
+    }
+    const auto& thirty = profile.tintLists[4][30];
+    EXPECT_EQ(std::vector<double>(thirty.channel, thirty.channel + 7), (std::vector<double>{0, 0, 0, 0, 30, 0, 0}));
+}
+
+TEST_F(RampProfile, TrappingPrediction)
+{
+    profile.setSample(100, 0, 0, 0, 0, 0, 0);
+    profile.calcMultiChannelSample();
+    for (int j = 0; j < 36; ++j)
+        EXPECT_NEAR(sample().spectrum[j], solids[0].spectrum[j], 1e-14) << "one ink at 100 % gives its solid";
+
+    profile.setSample(0, 0, 0, 0, 100, 0, 0);
+    profile.calcMultiChannelSample();
+    for (int j = 0; j < 36; ++j)
+        EXPECT_NEAR(sample().spectrum[j], solids[4].spectrum[j], 1e-14);
+
+    profile.setSample(100, 100, 0, 0, 0, 0, 0);
+    profile.calcMultiChannelSample();
+    for (int j = 0; j < 36; ++j)
+        EXPECT_NEAR(sample().spectrum[j], solids[0].spectrum[j] * std::pow(solids[1].spectrum[j] / 0.9, 0.85), 1e-14);
+
+    // The seventh ink after four full inks: exponent 0.85^4.
+    profile.setSample(100, 100, 100, 100, 0, 0, 100);
+    profile.calcMultiChannelSample();
+    const MathProfile::ColorPatch trapped = sample();
+    profile.calcSeparationSample();
+    for (int j = 0; j < 36; ++j) {
+        double expected = solids[0].spectrum[j];
+        double separated = solids[0].spectrum[j];
+        const int inks[] = {1, 2, 3, 6};
+        for (int n = 0; n < 4; ++n) {
+            expected *= std::pow(solids[inks[n]].spectrum[j] / 0.9, std::pow(0.85, n + 1));
+            separated *= std::pow(solids[inks[n]].spectrum[j] / 0.9, 0.95);
+        }
+        EXPECT_NEAR(trapped.spectrum[j], expected, 1e-13) << j;
+        EXPECT_NEAR(sample().spectrum[j], separated, 1e-13) << j;
+    }
+
+    profile.setSample(0, 0, 0, 0, 0, 0, 0);
+    profile.calcMultiChannelSample();
+    for (int j = 0; j < 36; ++j)
+        EXPECT_NEAR(sample().spectrum[j], 0.9, 1e-14) << "nothing printed: the paper";
+    profile.calcSeparationSample();
+    for (int j = 0; j < 36; ++j)
+        EXPECT_NEAR(sample().spectrum[j], 0.9, 1e-14);
+}
+
+TEST(MultiChannelChart, GoldenChartsAndTheExchange)
+{
+    for (int process : {3, 5}) {
+        TempDir dir;
+        MeasurementBlock block = readGoldenInput("multichannel.in");
+        const std::vector<int> before = block.ints;
+        void* profile = CreateMathProfile("exchange");
+        ASSERT_EQ(calculate(profile, process, dir.path("spectral.txt"), block), VM_STATUS_OK);
+        EXPECT_EQ(readFile(dir.path("spectral.txt")),
+                  readFile(goldenPath("multichannel.p" + std::to_string(process) + ".chart")));
+        for (int i = 0; i < VM_EXCHANGE_RECORDS; ++i) {
+            const auto& cmyk = MathProfile::ZANExtended[static_cast<size_t>(i)];
+            for (int c = 0; c < 4; ++c)
+                ASSERT_EQ(block.ints[static_cast<size_t>(7 * i + c)], cmyk[static_cast<size_t>(c)]);
+            for (int c = 4; c < 7; ++c)
+                ASSERT_EQ(block.ints[static_cast<size_t>(7 * i + c)], before[static_cast<size_t>(7 * i + c)]);
+        }
+        // The host separates the combinations; process 6 predicts them.
+        loadSeparations(block.ints);
+        ASSERT_EQ(calculate(profile, VM_PROCESS_SEPARATED_SET, dir.path("xyz.txt"), block), VM_STATUS_OK);
+        EXPECT_EQ(readFile(dir.path("xyz.txt")),
+                  readFile(goldenPath("multichannel.p" + std::to_string(process) + "-p6.chart")));
+        DestroyMathProfile(profile);
+    }
+}
+
+TEST(MultiChannelChart, SixColourLayout)
+{
+    TempDir dir;
+    MeasurementBlock block = readGoldenInput("multichannel.in");
+    void* profile = CreateMathProfile("six");
+    ASSERT_EQ(calculate(profile, VM_PROCESS_SIX_COLOUR, dir.path("six.txt"), block), VM_STATUS_OK);
+    DestroyMathProfile(profile);
+    const std::string text = readFile(dir.path("six.txt"));
+    const std::string header = "IT8.7\r\nTARGET_ID\t\"5.11\"\r\nTARGET\r\nLAYOUT_ID\r\nNUMBER_OF_SETS\t128\n"
+                               "NUMBER_OF_FIELDS\t43\nBEGIN_DATA_FORMAT\nCMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K\tRGB_R\t";
+    EXPECT_EQ(text.substr(0, header.size()), header);
+    const auto all = lines(text);
+    ASSERT_EQ(all.size(), 10u + 128u + 1u);
+    EXPECT_EQ(all.back(), "END_DATA");
+    for (size_t i = 10; i < 138; ++i) {
+        const auto values = fields(all[i]);
+        ASSERT_EQ(values.size(), 44u) << "43 values, each followed by TAB";
+        EXPECT_EQ(values[5], "0") << "channel 5 is never printed";
+    }
+    EXPECT_EQ(all[10 + 22].substr(0, 16), "0\t0\t0\t0\t100\t0\t0\t");
+    EXPECT_EQ(all[10 + 44].substr(0, 16), "0\t0\t0\t0\t0\t0\t100\t");
+}
+
+TEST(MultiChannelChart, SeparatedSetReadsThousandthsOfAPercent)
+{
+    TempDir dir;
+    MeasurementBlock block = readGoldenInput("multichannel.in");
+    void* profile = CreateMathProfile("thousandths");
+    ASSERT_EQ(calculate(profile, VM_PROCESS_SEVEN_COLOUR, dir.path("s.txt"), block), VM_STATUS_OK);
+    MathProfile* object = static_cast<MathProfile*>(profile);
+
+    // Records 0..6 carry a value in cyan only; the rest are paper.
+    std::fill(block.ints.begin(), block.ints.end(), 0);
+    const int hostValues[] = {99, 100, 50099, 50100, 100100, -1899, -1900};
+    const double coverage[] = {0, 1, 50, 51, 101, 0, -1};
+    for (int r = 0; r < 7; ++r)
+        block.ints[static_cast<size_t>(7 * r)] = hostValues[r];
+    ASSERT_EQ(calculate(profile, VM_PROCESS_SEPARATED_SET, dir.path("x.txt"), block), VM_STATUS_OK);
+    const auto chart = lines(readFile(dir.path("x.txt")));
+    ASSERT_EQ(chart.size(), 7u + 3499u + 1u);
+
+    auto predicted = [&](double cyan) {
+        object->setSample(cyan, 0, 0, 0, 0, 0, 0);
+        object->calcSeparationSample();
+        double xyz[3] = {object->patchSlots[21].XYZ[0], object->patchSlots[21].XYZ[1], object->patchSlots[21].XYZ[2]};
+        std::ostringstream line;
+        line << std::floor(xyz[0] * 100) / 100 << '\t' << std::floor(xyz[1] * 100) / 100 << '\t'
+             << std::floor(xyz[2] * 100) / 100;
+        return line.str();
+    };
+    auto xyzOf = [](const std::string& line) {
+        const auto v = fields(line);
+        return v.at(5) + "\t" + v.at(6) + "\t" + v.at(7);
+    };
+    for (int r = 0; r < 7; ++r) {
+        const auto values = fields(chart[static_cast<size_t>(7 + r)]);
+        EXPECT_EQ(values[0], std::to_string(r + 1));
+        // The label is the extended combination, whatever the host wrote.
+        const auto& cmyk = MathProfile::ZANExtended[static_cast<size_t>(r)];
+        EXPECT_EQ(values[4], std::to_string(cmyk[3]));
+        EXPECT_EQ(xyzOf(chart[static_cast<size_t>(7 + r)]), predicted(coverage[r])) << hostValues[r];
+    }
+    // Coverages outside 0..100 find no ramp patch: unprinted, the paper.
+    EXPECT_EQ(xyzOf(chart[7 + 4]), predicted(0));
+    EXPECT_EQ(xyzOf(chart[7 + 6]), predicted(0));
+    EXPECT_EQ(xyzOf(chart[7 + 100]), predicted(0));
+    DestroyMathProfile(profile);
+}
+
+TEST(MultiChannelChart, OtherProcessesWriteOnlyTheEnd)
+{
+    TempDir dir;
+    RowTable rows(syntheticForm());
+    MathProfile profile("other");
+    std::vector<int> buffer(VM_EXCHANGE_BUFFER_INTS, 7);
+    profile.calculateChartMCH(rows.rows(), VM_PROCESS_OFFSET, dir.path("e.txt").c_str(), buffer.data());
+    EXPECT_EQ(readFile(dir.path("e.txt")), "END_DATA\n");
+    EXPECT_EQ(buffer, std::vector<int>(VM_EXCHANGE_BUFFER_INTS, 7));
+    for (const auto& list : profile.tintLists)
+        EXPECT_TRUE(list.empty());
+}
+
+TEST(MultiChannelChart, SeparatedSetNeedsTheRampsOfAPrecedingChart)
+{
+    TempDir dir;
+    MeasurementBlock block = readGoldenInput("multichannel.in");
+    void* profile = CreateMathProfile("no ramps");
+    EXPECT_EQ(calculate(profile, VM_PROCESS_SEPARATED_SET, dir.path("x.txt"), block), VM_STATUS_INVALID_MEASUREMENTS);
+    EXPECT_FALSE(fileExists(dir.path("x.txt")));
+    ASSERT_EQ(calculate(profile, VM_PROCESS_SIX_COLOUR, dir.path("s.txt"), block), VM_STATUS_OK);
+    EXPECT_EQ(readFile(dir.path("s.txt")), readFile(goldenPath("multichannel.p3.chart")));
+    DestroyMathProfile(profile);
+}
