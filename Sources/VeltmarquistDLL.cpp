@@ -135,14 +135,17 @@ bool measurementBlockValid(const MathProfile* profile, PrintProcess process, con
         return false;
     if (count > kMaxPatches || count < patchesRead(process))
         return false;
-    if (inputKind == VM_INPUT_16BAND)
-        return valuesPerPatch == 16;
-    if (valuesPerPatch < 1 || valuesPerPatch > kPatchStride)
-        return false;
-    if (firstWavelength > 380 && (firstWavelength > 740 || valuesPerPatch > 36))
-        return false;
-    if (placementOf(firstWavelength, valuesPerPatch).copied < 1)
-        return false;
+    if (inputKind == VM_INPUT_16BAND) {
+        if (valuesPerPatch != 16)
+            return false;
+    } else {
+        if (valuesPerPatch < 1 || valuesPerPatch > kPatchStride)
+            return false;
+        if (firstWavelength > 380 && (firstWavelength > 740 || valuesPerPatch > 36))
+            return false;
+        if (placementOf(firstWavelength, valuesPerPatch).copied < 1)
+            return false;
+    }
     if (process == VM_PROCESS_SEPARATED_SET)
         for (const auto& list : profile->tintLists)
             if (list.empty())
@@ -202,13 +205,14 @@ int runCalculation(MathProfile* profile, PrintProcess process, const char* path,
             for (int b = 0; b < MathProfile::kBands; ++b)
                 buffers.patchMatrix[i * kPatchStride + b] = profile->InterpolateSpectralValue(b, sixteen);
         }
-        firstWavelength = 380;
-        valuesPerPatch = 36;
     }
-    const Placement placement = placementOf(firstWavelength, valuesPerPatch);
+    // Widened 16-band patches are placed as 36 bands from 380 nm; the host's
+    // channel values still stand behind its own 16-value patches.
+    const int placedFirst = inputKind == VM_INPUT_16BAND ? 380 : firstWavelength;
+    const int placedBands = inputKind == VM_INPUT_16BAND ? 36 : valuesPerPatch;
+    const Placement placement = placementOf(placedFirst, placedBands);
     for (int i = 0; i < count; ++i)
-        placeBands(buffers.patchMatrix + i * kPatchStride, buffers.rows[i], firstWavelength, valuesPerPatch,
-                   placement);
+        placeBands(buffers.patchMatrix + i * kPatchStride, buffers.rows[i], placedFirst, placedBands, placement);
 
     if (process == VM_PROCESS_CHART_COPY || process == VM_PROCESS_CHART_CONVERT || process == VM_PROCESS_CHART_BLEND)
         for (int i = 0; i < count; ++i)

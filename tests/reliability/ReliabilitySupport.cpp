@@ -53,12 +53,11 @@ void putSeparations(MeasurementBlock& block)
         throw std::runtime_error("malformed golden separations");
 }
 
-void* primedProfile()
+void* primedProfile(const std::string& path)
 {
-    TempDir dir;
     MeasurementBlock block = readGoldenInput("multichannel.in");
     void* profile = CreateMathProfile("primed");
-    const int status = calculate(profile, VM_PROCESS_SIX_COLOUR, dir.path("p3.txt"), block);
+    const int status = calculate(profile, VM_PROCESS_SIX_COLOUR, path, block);
     if (status != VM_STATUS_OK)
         throw std::runtime_error("process 3 on the golden multi-channel form failed");
     return profile;
@@ -83,10 +82,8 @@ int dataLines(const std::string& chart)
     return -1;
 }
 
-::testing::AssertionResult servesFollowUp(void* profile, FollowUp followUp)
+::testing::AssertionResult servesFollowUp(void* profile, FollowUp followUp, const std::string& out)
 {
-    TempDir dir;
-    const std::string out = dir.path("follow-up.txt");
     MeasurementBlock block;
     int process = 0;
     std::string golden;

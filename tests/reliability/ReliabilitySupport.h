@@ -29,8 +29,9 @@ ProfileState stateOf(const void* profile);
 // exchange records of `block`.
 void putSeparations(MeasurementBlock& block);
 
-// A profile that holds the tone ramps of a six-colour chart, as process 6 needs.
-void* primedProfile();
+// A profile that holds the tone ramps of a six-colour chart, as process 6
+// needs; its chart goes to `path`.
+void* primedProfile(const std::string& path);
 
 // Data lines between BEGIN_DATA and END_DATA of a chart, or -1 when the chart
 // does not end with "END_DATA" and a line feed (an incomplete file).
@@ -42,7 +43,8 @@ int dataLines(const std::string& chart);
 //   process 1 on the test form, reads the tint lists, slots and gravure factors;
 //   process 6 with the golden separations, reads the ramps of a preceding 3.
 enum class FollowUp { ChartCopy, Gravure, SeparatedSet };
-::testing::AssertionResult servesFollowUp(void* profile, FollowUp followUp);
+// The chart goes to `path`.
+::testing::AssertionResult servesFollowUp(void* profile, FollowUp followUp, const std::string& path);
 
 } // namespace reliability
 
