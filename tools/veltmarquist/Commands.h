@@ -1,0 +1,67 @@
+// The tool's commands. Each reads its inputs, runs the library and writes its
+// outputs, reports to `out`, and throws a ToolError on any failure (with no
+// output left behind under its final name).
+#ifndef VELTMARQUIST_TOOL_COMMANDS_H
+#define VELTMARQUIST_TOOL_COMMANDS_H
+
+#include "MeasurementFile.h"
+
+#include "VeltmarquistDLL.h"
+
+#include <ostream>
+#include <string>
+
+namespace veltmarquist {
+
+// chart FORM -o CHART: the 900-patch characterisation chart of a four-colour
+// process from the 46 test-form patches (process 0 or 1).
+struct ChartOptions {
+    std::string form;
+    std::string output;
+    PrintProcess process = VM_PROCESS_OFFSET;
+    bool fitGravure = false; // fit ink order and trapping factors first (gravure only)
+    ReadOptions read;
+};
+void runChart(const ChartOptions& options, std::ostream& out);
+
+// compare FORM: the measured and the modelled 46-step charts and their
+// colour differences, patch by patch.
+struct CompareOptions {
+    std::string form;
+    std::string outputFolder = ".";
+    PrintProcess process = VM_PROCESS_OFFSET;
+    bool fitGravure = false;
+    ReadOptions read;
+};
+void runCompare(const CompareOptions& options, std::ostream& out);
+
+// multichannel FORM --inks 6|7 -o CHART: the six- or seven-colour spectral
+// chart (process 3 or 5), the extended C, M, Y, K combinations for the
+// user's separation software, and with its separations the XYZ chart of
+// process 6, all on one profile.
+struct MultiChannelOptions {
+    std::string form;
+    int inks = 7;
+    std::string output;
+    std::string combinations;  // optional
+    std::string separations;   // optional, needs separatedOutput
+    std::string separatedOutput;
+    ReadOptions read;
+};
+void runMultiChannel(const MultiChannelOptions& options, std::ostream& out);
+
+// convert CHART --from WHITE --to WHITE -o OUT: a measured chart copied,
+// converted from one paper white to another, or blended (processes 7-9).
+struct ConvertOptions {
+    std::string chart;
+    std::string from; // a file with one spectrum, or a sample name in the chart
+    std::string to;
+    std::string output;
+    PrintProcess mode = VM_PROCESS_CHART_CONVERT;
+    ReadOptions read;
+};
+void runConvert(const ConvertOptions& options, std::ostream& out);
+
+} // namespace veltmarquist
+
+#endif // VELTMARQUIST_TOOL_COMMANDS_H

@@ -1,0 +1,108 @@
+// Picking the patches a calculation needs out of a measurement file by their
+// device values, and turning them into the library's measurement block.
+//
+// A measured test form and a full characterisation measurement both work: a
+// patch is found by its C, M, Y, K (and further channel) values wherever it
+// stands in the file; repeated measurements of one combination are averaged;
+// everything else in the file is ignored.
+#ifndef VELTMARQUIST_TOOL_PATCHMATCHING_H
+#define VELTMARQUIST_TOOL_PATCHMATCHING_H
+
+#include "MeasurementFile.h"
+
+#include "MathProfile.h"
+
+#include <map>
+#include <string>
+#include <vector>
+
+namespace veltmarquist {
+
+// A patch that a calculation needs: its device values in percent (channels in
+// file order: C, M, Y, K, then further inks; missing channels count as 0).
+struct PatchRequest {
+    std::vector<double> device;
+    std::string label; // "test-form patch 18 (C 0 M 90 Y 0 K 0)"
+};
+
+// The 46 patches of the four-colour test form, in measuring order.
+std::vector<PatchRequest> testFormRequests();
+// The patches of the six- or seven-ink form in the order the multi-channel
+// processes read them: C, M, Y, K solids, paper, three unused places (filled
+// with the paper), then the solids of the further inks.
+std::vector<PatchRequest> multiChannelRequests(int inks);
+// "C 0 M 90 Y 0 K 0" or, beyond four channels, "ink5 100".
+std::string describeDevice(const std::vector<double>& device);
+
+// The sets of a file grouped by device values (to 0.1 %).
+class CombinationIndex {
+public:
+    explicit CombinationIndex(const MeasurementFile& file);
+    // Indices of the sets measured with these device values; empty if none.
+    const std::vector<size_t>& find(const std::vector<double>& device) const;
+    // Mean reflectance of the sets measured with these device values.
+    std::vector<double> averageReflectance(const std::vector<size_t>& sets) const;
+    size_t combinations() const { return sets_.size(); }
+
+    using Key = std::vector<long>;
+    static Key keyOf(const std::vector<double>& device);
+
+private:
+    const MeasurementFile& file_;
+    std::map<Key, std::vector<size_t>> sets_;
+};
+
+struct PickedPatches {
+    std::vector<std::vector<double>> reflectance; // one averaged spectrum per request
+    size_t averaged = 0;                          // requests with more than one measurement
+    size_t setsUsed = 0;                          // sets of the file that went into them
+    size_t setsIgnored = 0;                       // sets of the file that no request uses
+};
+
+// Finds every request in the file. A request that is not there is a
+// MissingPatch error naming the patch and the file.
+PickedPatches pickPatches(const MeasurementFile& file, const std::vector<PatchRequest>& requests,
+                          const std::string& fileName);
+
+// ---- The library's measurement block ---------------------------------------------
+
+// Integers as CalculateChart takes them: reflectance x 1000, patch after patch.
+struct MeasurementBlock {
+    int inputKind = VM_INPUT_10NM;
+    int firstWavelength = 380;
+    int valuesPerPatch = 36;
+    int count = 0;
+    std::vector<int> ints;
+};
+
+// A spectrum and the layout of its bands.
+struct Spectrum {
+    const SpectralLayout* layout;
+    const std::vector<double>* reflectance;
+};
+
+// The block of the spectra, padded with zeros to at least `minimumInts`.
+// Spectra of 16 bands (all of them) go in as input kind 20; everything else as
+// 36 bands, 380 to 730 nm: bands outside that range are dropped, and the
+// bands in front of the first or behind the last measured band repeat it.
+MeasurementBlock buildBlock(const std::vector<Spectrum>& spectra, size_t minimumInts = 0);
+
+// The 36-band spectrum (380..730 nm) that the library makes of one spectrum.
+std::vector<double> libraryBands(const Spectrum& spectrum);
+
+// A row table as CalculateChart builds it from a block: 2000 entries, rows
+// 0 to count - 1 present, 36 values each. For the class methods that no entry
+// point reaches (the gravure fit, the 46-step chart).
+class RowTable {
+public:
+    explicit RowTable(const MeasurementBlock& block);
+    double** rows() { return table_.data(); }
+
+private:
+    std::vector<std::vector<double>> storage_;
+    std::vector<double*> table_;
+};
+
+} // namespace veltmarquist
+
+#endif // VELTMARQUIST_TOOL_PATCHMATCHING_H

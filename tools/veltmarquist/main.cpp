@@ -1,0 +1,188 @@
+// veltmarquist: the command-line host of the library.
+//
+// Parses the command line, runs one command, and maps every failure to one
+// line on stderr and a documented exit code.
+#include "Commands.h"
+#include "ToolError.h"
+
+#include "VeltmarquistDLL.h"
+
+#include <CLI/CLI.hpp>
+
+#include <cstdio>
+#include <iostream>
+#include <new>
+
+#ifndef VELTMARQUIST_VERSION
+#define VELTMARQUIST_VERSION "unknown"
+#endif
+
+namespace {
+
+using namespace veltmarquist;
+
+const char* const kExitCodes =
+    "Exit codes:\n"
+    "  0  success\n"
+    "  1  internal error\n"
+    "  2  bad command line\n"
+    "  3  an input file cannot be opened or read\n"
+    "  4  an input file is not readable CGATS / IT8 text\n"
+    "  5  unsupported content: unknown spectral layout, missing fields, bad values\n"
+    "  6  a patch the calculation needs is missing\n"
+    "  7  duplicate patch: one sample identifier names two different patches\n"
+    "  8  an output file cannot be written\n"
+    "  9  the library rejected or failed the calculation\n";
+
+std::string versionText()
+{
+    char number[32];
+    std::snprintf(number, sizeof number, "%.1f", VeltmarquistDLLVersionNumber);
+    return std::string("veltmarquist ") + VELTMARQUIST_VERSION + " (library VeltmarquistDLL " + number + ")";
+}
+
+void addScale(CLI::App& command, std::string& scale)
+{
+    command
+        .add_option("--scale", scale,
+                    "reflectance scale of the input spectra: auto (values above 2 mean percent), 1 or 100")
+        ->check(CLI::IsMember({"auto", "1", "100"}))
+        ->capture_default_str();
+}
+
+ReadOptions readOptions(const std::string& scale)
+{
+    ReadOptions options;
+    options.scale = scale == "auto" ? 0.0 : std::stod(scale);
+    return options;
+}
+
+PrintProcess fourColourProcess(const std::string& name)
+{
+    return name == "gravure" ? VM_PROCESS_GRAVURE : VM_PROCESS_OFFSET;
+}
+
+// The process of chart and compare: --fit-gravure implies gravure and
+// contradicts an explicit --process offset.
+PrintProcess chosenProcess(const CLI::App& command, const std::string& name, bool fitGravure)
+{
+    const bool given = command.get_option("--process")->count() > 0;
+    if (fitGravure && given && name == "offset")
+        throw ToolError(Failure::Usage, "--fit-gravure fits the gravure model; it cannot go with --process offset");
+    return fitGravure ? VM_PROCESS_GRAVURE : fourColourProcess(name);
+}
+
+int fail(const ToolError& error)
+{
+    std::cout.flush();
+    std::cerr << "veltmarquist: error: " << error.what() << "\n";
+    return exitCodeOf(error.failure());
+}
+
+} // namespace
+
+int main(int argc, char** argv)
+{
+    CLI::App app{"Spectral print models and characterisation charts from measured test forms.", "veltmarquist"};
+    app.set_version_flag("--version", versionText());
+    app.require_subcommand(1);
+    app.footer(kExitCodes);
+
+    std::string scale = "auto", processName = "offset";
+
+    ChartOptions chart;
+    CLI::App* chartCommand = app.add_subcommand(
+        "chart", "900-patch characterisation chart (XYZ) from a measured four-colour test form");
+    chartCommand->add_option("FORM", chart.form, "measurement file with the 46 test-form patches (any order)")
+        ->required();
+    chartCommand->add_option("-o,--output", chart.output, "chart file to write")->required();
+    chartCommand->add_option("--process", processName, "print model")
+        ->check(CLI::IsMember({"offset", "gravure"}))
+        ->capture_default_str();
+    chartCommand->add_flag("--fit-gravure", chart.fitGravure,
+                           "fit the gravure ink order and trapping factors first (implies --process gravure)");
+    addScale(*chartCommand, scale);
+
+    CompareOptions compare;
+    CLI::App* compareCommand = app.add_subcommand(
+        "compare", "measured and modelled 46-step charts of a test form and their colour differences");
+    compareCommand->add_option("FORM", compare.form, "measurement file with the 46 test-form patches")->required();
+    compareCommand->add_option("-o,--output-folder", compare.outputFolder,
+                               "folder for FORM.measured46.txt and FORM.offset46.txt / FORM.gravure46.txt")
+        ->capture_default_str();
+    compareCommand->add_option("--process", processName, "print model")
+        ->check(CLI::IsMember({"offset", "gravure"}))
+        ->capture_default_str();
+    compareCommand->add_flag("--fit-gravure", compare.fitGravure, "fit the gravure model first");
+    addScale(*compareCommand, scale);
+
+    MultiChannelOptions multi;
+    CLI::App* multiCommand = app.add_subcommand(
+        "multichannel", "six- or seven-colour spectral chart, extended combinations and their separated XYZ chart");
+    multiCommand->add_option("FORM", multi.form, "measurement file with paper and solids (nCLR_1 ... nCLR_n fields)")
+        ->required();
+    multiCommand->add_option("--inks", multi.inks, "number of inks")->required()->check(CLI::IsMember({6, 7}));
+    multiCommand->add_option("-o,--output", multi.output, "spectral chart to write")->required();
+    multiCommand->add_option("--combinations", multi.combinations,
+                             "write the 3499 extended C, M, Y, K combinations (CGATS) here");
+    CLI::Option* separations = multiCommand->add_option(
+        "--separations", multi.separations, "the separation software's channel values for the combinations (CGATS, %)");
+    CLI::Option* separatedOut = multiCommand->add_option("--separated-out", multi.separatedOutput,
+                                                         "XYZ chart of the separated combinations to write");
+    separations->needs(separatedOut);
+    separatedOut->needs(separations);
+    addScale(*multiCommand, scale);
+
+    ConvertOptions convert;
+    std::string mode = "convert";
+    CLI::App* convertCommand =
+        app.add_subcommand("convert", "measured spectral chart copied, converted or blended to another paper white");
+    convertCommand->add_option("CHART", convert.chart, "measured chart (device and spectral fields)")->required();
+    convertCommand->add_option("--from", convert.from,
+                               "white the chart was printed on: a file with one spectrum, or a sample name in CHART");
+    convertCommand->add_option("--to", convert.to, "white to convert to: a file or a sample name in CHART");
+    convertCommand->add_option("--mode", mode, "copy, convert, or blend converted and measured spectra")
+        ->check(CLI::IsMember({"copy", "convert", "blend"}))
+        ->capture_default_str();
+    convertCommand->add_option("-o,--output", convert.output, "spectral chart to write")->required();
+    addScale(*convertCommand, scale);
+
+    try {
+        app.parse(argc, argv);
+    } catch (const CLI::Success& done) {
+        return app.exit(done); // --help, --version
+    } catch (const CLI::ParseError& error) {
+        return fail(ToolError(Failure::Usage, std::string(error.what()) + " (see veltmarquist --help)"));
+    }
+
+    try {
+        const ReadOptions read = readOptions(scale);
+        if (*chartCommand) {
+            chart.process = chosenProcess(*chartCommand, processName, chart.fitGravure);
+            chart.read = read;
+            runChart(chart, std::cout);
+        } else if (*compareCommand) {
+            compare.process = chosenProcess(*compareCommand, processName, compare.fitGravure);
+            compare.read = read;
+            runCompare(compare, std::cout);
+        } else if (*multiCommand) {
+            multi.read = read;
+            runMultiChannel(multi, std::cout);
+        } else if (*convertCommand) {
+            convert.mode = mode == "copy" ? VM_PROCESS_CHART_COPY
+                                          : mode == "blend" ? VM_PROCESS_CHART_BLEND : VM_PROCESS_CHART_CONVERT;
+            if (convert.mode != VM_PROCESS_CHART_COPY && (convert.from.empty() || convert.to.empty()))
+                throw ToolError(Failure::Usage, "--mode " + mode + " needs --from and --to");
+            convert.read = read;
+            runConvert(convert, std::cout);
+        }
+    } catch (const ToolError& error) {
+        return fail(error);
+    } catch (const std::bad_alloc&) {
+        return fail(ToolError(Failure::Internal, "out of memory"));
+    } catch (const std::exception& error) {
+        return fail(ToolError(Failure::Internal, error.what()));
+    }
+    std::cout.flush();
+    return std::cout ? 0 : exitCodeOf(Failure::OutputUnwritable);
+}
