@@ -161,6 +161,7 @@ void runMultiChannel(const MultiChannelOptions& options, std::ostream& out)
                                                    std::to_string(form.deviceFields.size()) + " device channels");
     const PickedPatches picked = pickPatches(form, multiChannelRequests(options.inks), options.form);
     out << "form: " << options.form << ": " << form.sets.size() << " measurements, " << form.layout.describe()
+        << ", reflectance 0-" << (form.scale == 100.0 ? "100" : "1") << (form.scaleDetected ? " (detected)" : " (given)")
         << "\n  paper and " << options.inks << " solids found; " << picked.setsIgnored
         << " other measurements ignored\n";
 
