@@ -11,10 +11,13 @@
 //
 // Every search compares strictly (a candidate wins only when the best so far
 // is greater), so ties go to the candidate met first; best scores start at 10000.
+#include "GrayFitGrid.h"
 #include "MathProfile.h"
 
 #include <cmath>
 #include <cstring>
+
+using namespace grayfit;
 
 namespace {
 
@@ -25,11 +28,61 @@ const double kNoScore = 10000.0;
 struct GrayPoint {
     int p[5];
 };
-enum { kPC, kPM, kPY, kPK, kPL };
+
+void setGrayFitFields(MathProfile& profile, const int point[5])
+{
+    for (int x = 0; x < 4; ++x)
+        profile.grayDiffFactor[x] = point[x] / 100.0;
+    profile.coverageLimit = point[kPL];
+}
 
 } // namespace
 
 void MathProfile::calculateGrayDiffFactor(double** rows)
+{
+    fitGrayDiffFactor(rows, false);
+}
+
+void MathProfile::calculateGrayDiffFactorStraightforward(double** rows)
+{
+    fitGrayDiffFactor(rows, true);
+}
+
+double MathProfile::scoreGrayPoint(const lab& grey3, const lab& grey4, const int point[5])
+{
+    setGrayFitFields(*this, point);
+    const ColorPatch& sample = patchSlots[kSlotCurrentSample];
+    setSample(40.0, 40.0, 40.0, 0.0, 0.0, 0.0, 0.0);
+    calcOffsetSample();
+    const double dE3 = deltaE(grey3, labOf(sample));
+    setSample(40.0, 40.0, 40.0, 40.0, 0.0, 0.0, 0.0);
+    calcOffsetSample();
+    const double dE4 = deltaE(grey4, labOf(sample));
+    return std::sqrt(dE3 * dE3 + dE4 * dE4);
+}
+
+void MathProfile::scanGrayGridStraightforward(const lab& grey3, const lab& grey4, int bestPoint[5],
+                                              double& bestScore)
+{
+    // Limit outermost and black innermost, every point scored in full.
+    GrayPoint point;
+    for (point.p[kPL] = kLimitAxis.first; point.p[kPL] <= kLimitAxis.last; point.p[kPL] += kLimitAxis.step)
+        for (point.p[kPC] = kCyanAxis.first; point.p[kPC] <= kCyanAxis.last; point.p[kPC] += kCyanAxis.step)
+            for (point.p[kPM] = kMagentaAxis.first; point.p[kPM] <= kMagentaAxis.last;
+                 point.p[kPM] += kMagentaAxis.step)
+                for (point.p[kPY] = kYellowAxis.first; point.p[kPY] <= kYellowAxis.last;
+                     point.p[kPY] += kYellowAxis.step)
+                    for (point.p[kPK] = kBlackAxis.first; point.p[kPK] <= kBlackAxis.last;
+                         point.p[kPK] += kBlackAxis.step) {
+                        const double s = scoreGrayPoint(grey3, grey4, point.p);
+                        if (bestScore > s) {
+                            bestScore = s;
+                            std::memcpy(bestPoint, point.p, sizeof point.p);
+                        }
+                    }
+}
+
+void MathProfile::fitGrayDiffFactor(double** rows, bool straightforward)
 {
     readData(rows);
     for (int list = 0; list < 4; ++list)
@@ -44,42 +97,24 @@ void MathProfile::calculateGrayDiffFactor(double** rows)
     // Rows 44 and 45 are read after readData, which may have exchanged rows.
     const lab grey3 = measuredLab(rows[44]);
     const lab grey4 = measuredLab(rows[45]);
+    auto score = [&](const GrayPoint& point) { return scoreGrayPoint(grey3, grey4, point.p); };
 
-    auto setFields = [this](const GrayPoint& point) {
-        for (int x = 0; x < 4; ++x)
-            grayDiffFactor[x] = point.p[x] / 100.0;
-        coverageLimit = point.p[kPL];
-    };
-    const ColorPatch& sample = patchSlots[kSlotCurrentSample];
-    auto score = [&](const GrayPoint& point) {
-        setFields(point);
-        setSample(40.0, 40.0, 40.0, 0.0, 0.0, 0.0, 0.0);
-        calcOffsetSample();
-        const double dE3 = deltaE(grey3, labOf(sample));
-        setSample(40.0, 40.0, 40.0, 40.0, 0.0, 0.0, 0.0);
-        calcOffsetSample();
-        const double dE4 = deltaE(grey4, labOf(sample));
-        return std::sqrt(dE3 * dE3 + dE4 * dE4);
-    };
-
-    // Coarse grid, limit outermost and black innermost: 3 x 16 x 16 x 21 x 26 points.
+    // Coarse grid. The fast evaluation finds the same best point and score as
+    // the point-by-point loop (GrayFitFastPath.cpp tells why); the loop stays
+    // as the reference and for a profile that the fast evaluation declines.
     double best = kNoScore;
     GrayPoint current = {{0, 0, 0, 0, 0}};
-    bool found = false;
-    GrayPoint point;
-    for (point.p[kPL] = 100; point.p[kPL] <= 300; point.p[kPL] += 100)
-        for (point.p[kPC] = -100; point.p[kPC] <= 50; point.p[kPC] += 10)
-            for (point.p[kPM] = -100; point.p[kPM] <= 50; point.p[kPM] += 10)
-                for (point.p[kPY] = 0; point.p[kPY] <= 200; point.p[kPY] += 10)
-                    for (point.p[kPK] = -200; point.p[kPK] <= 50; point.p[kPK] += 10) {
-                        const double s = score(point);
-                        if (best > s) {
-                            best = s;
-                            current = point;
-                            found = true;
-                        }
-                    }
-    if (!found) {
+    const bool scannedFast = !straightforward && scanGrayGridFast(grey3, grey4, current.p, best);
+    if (!scannedFast)
+        scanGrayGridStraightforward(grey3, grey4, current.p, best);
+    // Scores start at 10000 and only a smaller one is taken, so the best
+    // score is below 10000 exactly when some point scored.
+    if (!(best < kNoScore)) {
+        if (scannedFast) {
+            // Leave the prediction of the last grid point in the current
+            // sample and the primaries' weights, as the point-by-point loop does.
+            score(GrayPoint{{kCyanAxis.last, kMagentaAxis.last, kYellowAxis.last, kBlackAxis.last, kLimitAxis.last}});
+        }
         // Non-finite measurements: no point scores at all. Keep the
         // uncorrected model rather than a zero coverage limit.
         for (double& factor : grayDiffFactor)
@@ -87,11 +122,12 @@ void MathProfile::calculateGrayDiffFactor(double** rows)
         coverageLimit = 200.0;
         return;
     }
-    setFields(current);
+    setGrayFitFields(*this, current.p);
 
-    // Fine search: greedy coordinate moves with a shrinking step. A move is
-    // tried only when the value before it is inside its bound, so a factor can
-    // end up to 0.09 beyond +-10 and the limit between 91 and 407.
+    // Fine search: greedy coordinate moves with a shrinking step, every move
+    // scored in full. A move is tried only when the value before it is inside
+    // its bound, so a factor can end up to 0.09 beyond +-10 and the limit
+    // between 91 and 407.
     struct Move {
         int coordinate, sign, bound;
     };
@@ -114,7 +150,7 @@ void MathProfile::calculateGrayDiffFactor(double** rows)
                 }
             }
         } while (best < passStart);
-        setFields(current);
+        setGrayFitFields(*this, current.p);
     }
 }
 

@@ -16,6 +16,10 @@
 #include <fstream>
 #include <vector>
 
+namespace grayfit {
+class GridEvaluator;
+}
+
 // The library's exception. Code 1: a chart file could not be opened.
 class VELTMARQUIST_API Exceptions {
 public:
@@ -118,6 +122,11 @@ public:
     // Fits grayDiffFactor and coverageLimit to the two measured greys.
     // Precondition: 46 rows.
     void calculateGrayDiffFactor(double** rows);
+    // The same fit with every score of the coarse grid computed the
+    // straightforward way (setSample, calcOffsetSample and XYZ2LAB for both
+    // greys). Same fields, same profile state, many times slower: the reference
+    // that the fast evaluation is checked and measured against.
+    void calculateGrayDiffFactorStraightforward(double** rows);
     // Fits inkOrder and rgbFactor to the measured red, green and blue.
     // Precondition: 46 rows.
     void calculateRGBFactors(double** rows);
@@ -153,6 +162,25 @@ private:
     lab labOf(const ColorPatch& patch);
     // CIE 1976 colour difference sqrt(dL^2 + da^2 + db^2).
     static double deltaE(const lab& first, const lab& second);
+    // Exponent of one ink in the offset model: 1 - factor * sqrt(q * coverage / 100).
+    static double offsetExponent(double factor, double others, double coverage, double limit);
+    // The grey fit; `straightforward` scores the coarse grid point by point.
+    void fitGrayDiffFactor(double** rows, bool straightforward);
+    // Score of one point (pC, pM, pY, pK, pL) of the grey fit against the
+    // measured greys: sets the fields and predicts both greys.
+    double scoreGrayPoint(const lab& grey3, const lab& grey4, const int point[5]);
+    // The coarse grid of the grey fit, every point through scoreGrayPoint.
+    // Improves on the best point and score passed in (a tie keeps the earlier).
+    void scanGrayGridStraightforward(const lab& grey3, const lab& grey4, int bestPoint[5], double& bestScore);
+    // The same grid scored from cached dot areas, with the black factors as
+    // lanes of one loop: the same best point and score, bit for bit. Returns
+    // false without scoring when the three-colour grey would depend on the
+    // black factor.
+    bool scanGrayGridFast(const lab& grey3, const lab& grey4, int bestPoint[5], double& bestScore);
+
+    // The fast evaluation of the grey fit reads the model's inputs as
+    // calcOffsetSample does.
+    friend class grayfit::GridEvaluator;
 };
 
 #endif // VELTMARQUIST_MATHPROFILE_H

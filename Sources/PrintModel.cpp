@@ -75,6 +75,12 @@ MathProfile::ColorPatch& MathProfile::solidOf(int ink)
     return tintLists[ink].empty() ? patchSlots[kSlotPaper] : tintLists[ink].back();
 }
 
+double MathProfile::offsetExponent(double factor, double others, double coverage, double limit)
+{
+    const double q = others > limit ? 1.0 : others / limit;
+    return 1.0 - factor * std::sqrt(q * (coverage / 100.0));
+}
+
 void MathProfile::calcOffsetSample()
 {
     ColorPatch& sample = patchSlots[kSlotCurrentSample];
@@ -84,10 +90,8 @@ void MathProfile::calcOffsetSample()
     const double coverage[4] = {c, m, y, k};
     const double others[4] = {m + k + y, k + y + c, c + m + k, y + m + c};
     double exponent[4];
-    for (int x = 0; x < 4; ++x) {
-        const double q = others[x] > limit ? 1.0 : others[x] / limit;
-        exponent[x] = 1.0 - grayDiffFactor[x] * std::sqrt(q * (coverage[x] / 100.0));
-    }
+    for (int x = 0; x < 4; ++x)
+        exponent[x] = offsetExponent(grayDiffFactor[x], others[x], coverage[x], limit);
 
     ColorPatch& paper = patchSlots[kSlotPaper];
     ColorPatch* solid[4] = {&solidOf(0), &solidOf(1), &solidOf(2), &solidOf(3)};

@@ -1,0 +1,152 @@
+// Whole CalculateChart jobs on the golden inputs: the default job (process 0)
+// with the fast grey fit and with the straightforward one, the multi-channel
+// sequence 3 -> 6, and the chart conversions 7 to 9. After the run the ratio
+// of the two process-0 variants is printed, both measured in the same run.
+#include "TestSupport.h"
+
+#include <benchmark/benchmark.h>
+
+#include <cstdio>
+#include <map>
+#include <sstream>
+#include <string>
+
+using namespace testsupport;
+
+namespace {
+
+const MeasurementBlock& offsetForm()
+{
+    static const MeasurementBlock block = readGoldenInput("offset-form.in");
+    return block;
+}
+
+// Stops the benchmark with an error unless the call succeeded.
+bool succeeded(benchmark::State& state, int status, const char* what)
+{
+    if (status == VM_STATUS_OK)
+        return true;
+    state.SkipWithError((std::string(what) + " failed with status " + std::to_string(status)).c_str());
+    return false;
+}
+
+int calculate(void* profile, int process, const std::string& path, MeasurementBlock& block)
+{
+    return CalculateChart(profile, static_cast<PrintProcess>(process), path.c_str(), block.ints.data(),
+                          block.inputKind, block.firstWavelength, block.valuesPerPatch, block.count);
+}
+
+// The process-0 job through the C entry point: marshalling, grey fit, chart.
+void Process0_CalculateChart(benchmark::State& state)
+{
+    TempDir dir;
+    const std::string out = dir.path("p0.chart");
+    MeasurementBlock block = offsetForm();
+    for (auto _ : state) {
+        void* profile = CreateMathProfile("bench");
+        const bool ok = succeeded(state, calculate(profile, VM_PROCESS_OFFSET, out, block), "process 0");
+        DestroyMathProfile(profile);
+        if (!ok)
+            break;
+    }
+}
+BENCHMARK(Process0_CalculateChart)->Unit(benchmark::kMillisecond);
+
+// The same job as the members that CalculateChart runs, with the grey fit
+// chosen: the straightforward evaluation is reachable only this way.
+template <bool Straightforward>
+void Process0_Members(benchmark::State& state)
+{
+    TempDir dir;
+    const std::string out = dir.path("p0.chart");
+    for (auto _ : state) {
+        MathProfile profile("bench");
+        RowTable rows = RowTable::fromBlock(offsetForm());
+        if (Straightforward)
+            profile.calculateGrayDiffFactorStraightforward(rows.rows());
+        else
+            profile.calculateGrayDiffFactor(rows.rows());
+        profile.calculateChart(rows.rows(), VM_PROCESS_OFFSET, out.c_str());
+    }
+}
+BENCHMARK_TEMPLATE(Process0_Members, false)->Name("Process0_Members/fast")->Unit(benchmark::kMillisecond);
+BENCHMARK_TEMPLATE(Process0_Members, true)
+    ->Name("Process0_Members/straightforward")
+    ->Unit(benchmark::kMillisecond)
+    ->MinTime(3.0);
+
+// Process 3, then the host's separations, then process 6, on one profile.
+void Process3Then6(benchmark::State& state)
+{
+    TempDir dir;
+    const std::string out3 = dir.path("p3.chart"), out6 = dir.path("p6.chart");
+    const MeasurementBlock input = readGoldenInput("multichannel.in");
+    std::istringstream separations(readFile(goldenPath("multichannel.separations")));
+    std::vector<int> records(static_cast<size_t>(7 * VM_EXCHANGE_RECORDS));
+    for (int& value : records)
+        separations >> value;
+    for (auto _ : state) {
+        MeasurementBlock block = input; // process 3 writes into the buffer
+        void* profile = CreateMathProfile("bench");
+        bool ok = succeeded(state, calculate(profile, VM_PROCESS_SIX_COLOUR, out3, block), "process 3");
+        std::copy(records.begin(), records.end(), block.ints.begin());
+        ok = ok && succeeded(state, calculate(profile, VM_PROCESS_SEPARATED_SET, out6, block), "process 6");
+        DestroyMathProfile(profile);
+        if (!ok)
+            break;
+    }
+}
+BENCHMARK(Process3Then6)->Unit(benchmark::kMillisecond);
+
+void ChartConversion(benchmark::State& state)
+{
+    TempDir dir;
+    const std::string out = dir.path("conversion.chart");
+    const int process = static_cast<int>(state.range(0));
+    MeasurementBlock block = readGoldenInput("conversion.in");
+    for (auto _ : state) {
+        void* profile = CreateMathProfile("bench");
+        const bool ok = succeeded(state, calculate(profile, process, out, block), "conversion");
+        DestroyMathProfile(profile);
+        if (!ok)
+            break;
+    }
+}
+BENCHMARK(ChartConversion)->DenseRange(7, 9)->Unit(benchmark::kMicrosecond);
+
+// Console output as usual, plus the times of every run by name.
+class RatioReporter : public benchmark::ConsoleReporter {
+public:
+    void ReportRuns(const std::vector<Run>& runs) override
+    {
+        for (const Run& run : runs)
+            if (run.run_type == Run::RT_Iteration && !run.error_occurred)
+                times_[run.run_name.function_name] = {run.GetAdjustedRealTime(), run.GetAdjustedCPUTime()};
+        ConsoleReporter::ReportRuns(runs);
+    }
+    void printRatio(const std::string& slow, const std::string& fast) const
+    {
+        const auto s = times_.find(slow), f = times_.find(fast);
+        if (s != times_.end() && f != times_.end() && f->second.first > 0.0 && f->second.second > 0.0)
+            std::printf("%s / %s: %.1f x real time, %.1f x CPU time\n", slow.c_str(), fast.c_str(),
+                        s->second.first / f->second.first, s->second.second / f->second.second);
+    }
+
+private:
+    std::map<std::string, std::pair<double, double>> times_; // real, CPU
+};
+
+} // namespace
+
+int main(int argc, char** argv)
+{
+    benchmark::Initialize(&argc, argv);
+    if (benchmark::ReportUnrecognizedArguments(argc, argv))
+        return 1;
+    RatioReporter reporter;
+    benchmark::RunSpecifiedBenchmarks(&reporter);
+    reporter.printRatio("Process0_Members/straightforward", "Process0_Members/fast");
+    reporter.printRatio("Process0_Members/straightforward", "Process0_CalculateChart");
+    benchmark::Shutdown();
+    return 0;
+}

@@ -1,0 +1,256 @@
+// The fast grey fit against the straightforward one. On every form both must
+// leave the same fields, the same profile state (slots, weights, tint lists)
+// and, through it, the same chart bytes.
+#include "GrayFitFastPath.h"
+#include "TestSupport.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstring>
+#include <limits>
+#include <memory>
+#include <sstream>
+
+using namespace testsupport;
+
+namespace {
+
+using Form = std::vector<std::vector<double>>;
+
+// 36-band rows as CalculateChart prepares them, for either kind of golden
+// input (kind 10 at 380 nm with 36 bands, or 16 bands).
+Form rowsOf(const MeasurementBlock& block)
+{
+    MathProfile converter("rows");
+    Form form(static_cast<size_t>(block.count), std::vector<double>(36));
+    for (int i = 0; i < block.count; ++i) {
+        const int* values = block.ints.data() + i * block.valuesPerPatch;
+        double sixteen[16] = {};
+        for (int b = 0; b < 36; ++b) {
+            double& value = form[static_cast<size_t>(i)][static_cast<size_t>(b)];
+            if (block.inputKind == VM_INPUT_10NM) {
+                value = values[b] / 1000.0;
+                continue;
+            }
+            if (b == 0)
+                for (int j = 0; j < 16; ++j)
+                    sixteen[j] = values[j] / 1000.0;
+            value = converter.InterpolateSpectralValue(b, sixteen);
+        }
+    }
+    return form;
+}
+
+// One fit on its own profile and its own copy of the rows (readData may
+// exchange rows), then the 900-patch offset chart from the fitted profile.
+struct FitRun {
+    MathProfile profile{"fit"};
+    std::string chart;
+
+    FitRun(const Form& form, bool straightforward, void (*prepare)(MathProfile&))
+    {
+        if (prepare != nullptr)
+            prepare(profile);
+        RowTable rows(form);
+        if (straightforward)
+            profile.calculateGrayDiffFactorStraightforward(rows.rows());
+        else
+            profile.calculateGrayDiffFactor(rows.rows());
+        // The state that the fit leaves, before the chart adds to it.
+        std::memcpy(slotsAfterFit, profile.patchSlots, sizeof slotsAfterFit);
+        for (int list = 0; list < MathProfile::kChannels; ++list)
+            listsAfterFit[list] = profile.tintLists[list];
+        TempDir dir;
+        profile.calculateChart(rows.rows(), VM_PROCESS_OFFSET, dir.path("chart").c_str());
+        chart = readFile(dir.path("chart"));
+    }
+
+    MathProfile::ColorPatch slotsAfterFit[MathProfile::kSlots];
+    std::vector<MathProfile::ColorPatch> listsAfterFit[MathProfile::kChannels];
+};
+
+bool sameBytes(const void* first, const void* second, size_t size)
+{
+    return std::memcmp(first, second, size) == 0;
+}
+
+// Runs both fits and requires identical results; returns the fast run.
+std::unique_ptr<FitRun> expectSameFit(const Form& form, const std::string& what,
+                                      void (*prepare)(MathProfile&) = nullptr)
+{
+    SCOPED_TRACE(what);
+    auto fast = std::make_unique<FitRun>(form, false, prepare);
+    const FitRun reference(form, true, prepare);
+    for (int x = 0; x < 4; ++x)
+        EXPECT_EQ(fast->profile.grayDiffFactor[x], reference.profile.grayDiffFactor[x]) << "ink " << x;
+    EXPECT_EQ(fast->profile.coverageLimit, reference.profile.coverageLimit);
+    // Bytes, not values: NaN and signed zeros must match as well.
+    for (int slot = 0; slot < MathProfile::kSlots; ++slot)
+        EXPECT_TRUE(sameBytes(&fast->slotsAfterFit[slot], &reference.slotsAfterFit[slot], sizeof(MathProfile::ColorPatch)))
+            << "slot " << slot << " differs after the fit";
+    for (int list = 0; list < MathProfile::kChannels; ++list) {
+        const auto &a = fast->listsAfterFit[list], &b = reference.listsAfterFit[list];
+        EXPECT_EQ(a.size(), b.size()) << "tint list " << list;
+        EXPECT_TRUE(a.size() == b.size() && sameBytes(a.data(), b.data(), a.size() * sizeof a[0])) << "tint list " << list;
+    }
+    EXPECT_FALSE(fast->chart.empty());
+    EXPECT_EQ(fast->chart, reference.chart);
+    return fast;
+}
+
+} // namespace
+
+namespace {
+
+void multiChannelChartFirst(MathProfile& profile)
+{
+    TempDir dir;
+    MeasurementBlock block = readGoldenInput("multichannel.in");
+    ASSERT_EQ(CalculateChart(&profile, VM_PROCESS_SIX_COLOUR, dir.path("p3").c_str(), block.ints.data(),
+                             block.inputKind, block.firstWavelength, block.valuesPerPatch, block.count),
+              VM_STATUS_OK);
+}
+
+// Every lane of the fast grid against setSample + calcOffsetSample at the
+// same point: X, Y and Z bit for bit, for every limit, cyan and yellow
+// factor, every black factor, and every `magentaStride`-th magenta factor.
+// The fitted fields alone would hide a fast path that is off by one unit in
+// the last place: the float steps of the CIELAB cube root swallow it and the
+// best point rarely moves.
+void expectGridColoursMatch(const Form& form, const std::string& what, void (*prepare)(MathProfile&),
+                            int magentaStride)
+{
+    SCOPED_TRACE(what);
+    using namespace grayfit;
+    MathProfile fast("grid"), reference("reference");
+    RowTable fastRows(form), referenceRows(form);
+    for (auto run : {std::make_pair(&fast, &fastRows), std::make_pair(&reference, &referenceRows)}) {
+        if (prepare != nullptr)
+            prepare(*run.first);
+        run.first->readData(run.second->rows());
+        for (int list = 0; list < 4; ++list)
+            run.first->sortData(run.first->tintLists[list]);
+    }
+    GridEvaluator grid(fast);
+    ASSERT_TRUE(grid.threeColourGreyIgnoresBlack());
+
+    int compared = 0, mismatches = 0;
+    std::string firstMismatch;
+    // Predicts one grey at one point the straightforward way and compares.
+    auto check = [&](const int point[5], double black, const double* sumX, const double* sumY, const double* sumZ,
+                     int lane) {
+        for (int x = 0; x < 4; ++x)
+            reference.grayDiffFactor[x] = point[x] / 100.0;
+        reference.coverageLimit = point[kPL];
+        reference.setSample(40.0, 40.0, 40.0, black, 0.0, 0.0, 0.0);
+        reference.calcOffsetSample();
+        const double* expected = reference.patchSlots[MathProfile::kSlotCurrentSample].XYZ;
+        const double got[3] = {sumX[lane] * fast.normFactor, sumY[lane] * fast.normFactor,
+                               sumZ[lane] * fast.normFactor};
+        ++compared;
+        if (sameBytes(got, expected, sizeof got))
+            return;
+        if (mismatches++ == 0) {
+            std::ostringstream text;
+            text.precision(17);
+            text << "K" << black << " grey at (" << point[0] << ", " << point[1] << ", " << point[2] << ", "
+                 << point[3] << ", " << point[4] << "): X, Y, Z " << got[0] << ", " << got[1] << ", " << got[2]
+                 << " instead of " << expected[0] << ", " << expected[1] << ", " << expected[2];
+            firstMismatch = text.str();
+        }
+    };
+
+    LaneSums<kYellowLanes> sums3;
+    LaneSums<kBlackLanes> sums4;
+    for (int li = 0; li < kLimitAxis.count(); ++li) {
+        grid.selectLimit(li);
+        for (int ci = 0; ci < kCyanAxis.count(); ++ci)
+            for (int mi = 0; mi < kMagentaAxis.count(); mi += magentaStride) {
+                grid.threeColourSums(ci, mi, sums3);
+                for (int yi = 0; yi < kYellowAxis.count(); ++yi) {
+                    // Any black factor: the three-colour grey must not depend on it.
+                    const int point[5] = {kCyanAxis.at(ci), kMagentaAxis.at(mi), kYellowAxis.at(yi),
+                                          kBlackAxis.at(yi % kBlackAxis.count()), kLimitAxis.at(li)};
+                    check(point, 0.0, sums3.X, sums3.Y, sums3.Z, yi);
+                }
+                for (int yi = 0; yi < kYellowAxis.count(); ++yi) {
+                    grid.fourColourSums(ci, mi, yi, sums4);
+                    for (int ki = 0; ki < kBlackAxis.count(); ++ki) {
+                        const int point[5] = {kCyanAxis.at(ci), kMagentaAxis.at(mi), kYellowAxis.at(yi),
+                                              kBlackAxis.at(ki), kLimitAxis.at(li)};
+                        check(point, 40.0, sums4.X, sums4.Y, sums4.Z, ki);
+                    }
+                }
+            }
+    }
+    EXPECT_GT(compared, 0);
+    EXPECT_EQ(mismatches, 0) << "of " << compared << " predictions; first: " << firstMismatch;
+}
+
+} // namespace
+
+TEST(GrayFitFastPath, GridColoursAreThoseOfTheOffsetModelBitForBit)
+{
+    expectGridColoursMatch(rowsOf(readGoldenInput("offset-form.in")), "offset-form", nullptr, 5);
+    expectGridColoursMatch(syntheticForm(0), "synthetic variant 0", nullptr, 5);
+    expectGridColoursMatch(syntheticForm(2), "synthetic variant 2", nullptr, 5);
+    expectGridColoursMatch(syntheticForm(1), "synthetic variant 1 after process 3", multiChannelChartFirst, 5);
+}
+
+TEST(GrayFitFastPath, GoldenFormsFitAndChartAsTheStraightforwardSearch)
+{
+    const auto fast = expectSameFit(rowsOf(readGoldenInput("offset-form.in")), "offset-form");
+    EXPECT_EQ(fast->chart, readFile(goldenPath("offset-form.p0.chart")));
+    const auto k20 = expectSameFit(rowsOf(readGoldenInput("offset-form-k20.in")), "offset-form-k20");
+    EXPECT_EQ(k20->chart, readFile(goldenPath("offset-form-k20.p0.chart")));
+}
+
+TEST(GrayFitFastPath, SyntheticFormsIncludingOneReadInSwappedHalves)
+{
+    for (int variant : {1, 3})
+        expectSameFit(syntheticForm(variant), "synthetic variant " + std::to_string(variant));
+    // The two halves of the form measured in swapped order: readData
+    // exchanges the rows back before either fit reads rows 44 and 45.
+    Form swapped = syntheticForm(2);
+    for (size_t i = 0; i + 24 < swapped.size(); ++i)
+        std::swap(swapped[i], swapped[i + 24]);
+    expectSameFit(swapped, "synthetic variant 2, halves swapped");
+}
+
+TEST(GrayFitFastPath, ProfileReusedAfterAMultiChannelChart)
+{
+    // The multi-channel chart leaves 0 % tone-ramp patches in every tint
+    // list, so the three-colour grey selects a 0 % black patch instead of
+    // the paper, and each list's last patch is another solid.
+    expectSameFit(syntheticForm(1), "after process 3", multiChannelChartFirst);
+}
+
+TEST(GrayFitFastPath, TiedBlackFactorsResolveToTheFirstVisited)
+{
+    // Black printed as paper: its dot area is 0 in every band, every black
+    // factor of the grid predicts the same four-colour grey, and the first
+    // one visited (-2.00) must win in both evaluations.
+    Form form = syntheticForm(0);
+    for (int row = 0; row < 46; ++row) {
+        const auto& cmyk = MathProfile::dithering[row];
+        if (cmyk[3] != 0 && cmyk[0] == 0 && cmyk[1] == 0 && cmyk[2] == 0)
+            form[static_cast<size_t>(row)] = form[1];
+    }
+    const auto fast = expectSameFit(form, "black printed as paper");
+    EXPECT_EQ(fast->profile.grayDiffFactor[3], -2.0);
+}
+
+TEST(GrayFitFastPath, UnscorableFormKeepsTheUncorrectedModelAndTheSameState)
+{
+    // A NaN paper band makes every score NaN: no point is taken, the fields
+    // fall back to the construction values, and the current sample must
+    // still hold the prediction of the last grid point, as in the
+    // straightforward loop.
+    Form form = syntheticForm(0);
+    form[1][20] = std::numeric_limits<double>::quiet_NaN();
+    const auto fast = expectSameFit(form, "NaN paper band");
+    for (int x = 0; x < 4; ++x)
+        EXPECT_EQ(fast->profile.grayDiffFactor[x], 0.0);
+    EXPECT_EQ(fast->profile.coverageLimit, 200.0);
+}
