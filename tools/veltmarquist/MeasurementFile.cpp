@@ -193,7 +193,8 @@ private:
     NormalisedText result_;
     std::vector<std::string> out_;
     Section section_ = Section::Header;
-    bool sawFieldCount_ = false, sawSetCount_ = false;
+    // Declared counts and their lines; line 0: not declared.
+    std::pair<long, int> fieldCount_{0, 0}, setCount_{0, 0};
     int formatAt_ = -1, dataAt_ = -1; // indices in out_ of BEGIN_DATA_FORMAT / BEGIN_DATA
 };
 
@@ -217,8 +218,10 @@ void Normaliser::headerLine(const std::string& line, int number)
         section_ = Section::Data;
         return emit(keyword, number);
     }
-    sawFieldCount_ = sawFieldCount_ || name == "NUMBER_OF_FIELDS";
-    sawSetCount_ = sawSetCount_ || name == "NUMBER_OF_SETS";
+    if (name == "NUMBER_OF_FIELDS")
+        fieldCount_ = {std::atol(value.c_str()), number};
+    if (name == "NUMBER_OF_SETS")
+        setCount_ = {std::atol(value.c_str()), number};
     if (value.empty()) // also the first line that names the file type (CGATS.17, ISO28178, ...)
         return emit(keyword, number);
     if (quoted(value) || plainDecimal(value))
@@ -257,12 +260,21 @@ void Normaliser::finish()
         return fail(syntaxError(0, "no BEGIN_DATA_FORMAT line: not a CGATS measurement file"));
     if (dataAt_ < 0)
         return fail(syntaxError(0, "no BEGIN_DATA line: the file holds no data"));
+    if (result_.dataLines.empty())
+        return fail(contentError(0, "the file holds no data sets"));
+    const long rows = static_cast<long>(result_.dataLines.size()), fields = static_cast<long>(result_.fields.size());
+    if (setCount_.second > 0 && setCount_.first != rows)
+        return fail(syntaxError(setCount_.second, "NUMBER_OF_SETS says " + std::to_string(setCount_.first) +
+                                                      ", but the data holds " + std::to_string(rows) + " sets"));
+    if (fieldCount_.second > 0 && fieldCount_.first != fields)
+        return fail(syntaxError(fieldCount_.second, "NUMBER_OF_FIELDS says " + std::to_string(fieldCount_.first) +
+                                                        ", but the format names " + std::to_string(fields) + " fields"));
     // The parser needs both counts; add the ones the file leaves out.
-    if (!sawSetCount_) {
+    if (setCount_.second == 0) {
         out_.insert(out_.begin() + dataAt_, "NUMBER_OF_SETS\t" + std::to_string(result_.dataLines.size()));
         result_.originalLine.insert(result_.originalLine.begin() + dataAt_, result_.originalLine[dataAt_]);
     }
-    if (!sawFieldCount_) {
+    if (fieldCount_.second == 0) {
         out_.insert(out_.begin() + formatAt_, "NUMBER_OF_FIELDS\t" + std::to_string(result_.fields.size()));
         result_.originalLine.insert(result_.originalLine.begin() + formatAt_, result_.originalLine[formatAt_]);
     }
@@ -326,14 +338,15 @@ NormalisedText Normaliser::run(const std::string& text)
 // Collects the parser's last message (the context carries it, so separate
 // readers in separate threads do not mix their messages).
 struct ParserMessages {
-    std::string last;
+    std::string first;
 };
 
 void collectMessage(cmsContext context, cmsUInt32Number, const char* text)
 {
+    // The first message names the defect; later ones follow from it.
     auto* messages = static_cast<ParserMessages*>(cmsGetContextUserData(context));
-    if (messages != nullptr && text != nullptr)
-        messages->last = text;
+    if (messages != nullptr && text != nullptr && messages->first.empty())
+        messages->first = text;
 }
 
 // "Line 12, Count mismatch..." from the parser, with the line number
@@ -343,6 +356,8 @@ ReadError parserError(const std::string& message, const std::vector<int>& origin
     std::string text = message;
     while (!text.empty() && (text[0] == ':' || text[0] == ' '))
         text.erase(0, 1);
+    while (!text.empty() && std::isspace(static_cast<unsigned char>(text.back())))
+        text.pop_back();
     int line = 0;
     if (text.compare(0, 5, "Line ") == 0) {
         const size_t comma = text.find(',');
@@ -483,8 +498,6 @@ ReadResult extract(cmsHANDLE handle, const NormalisedText& normalised, const Rea
     file.hasXYZ = xyzColumns[0] >= 0 && xyzColumns[1] >= 0 && xyzColumns[2] >= 0;
 
     const size_t count = normalised.dataLines.size();
-    if (count == 0)
-        return failure(contentError(0, "the file holds no data sets"));
     double largest = 0.0;
     for (size_t row = 0; row < count; ++row) {
         MeasurementSet set;
@@ -649,7 +662,7 @@ ReadResult readMeasurementText(const std::string& text, const ReadOptions& optio
         static_cast<cmsContext>(context.get()), normalised.text.data(),
         static_cast<cmsUInt32Number>(normalised.text.size())));
     if (!handle)
-        return failure(parserError(messages.last, normalised.originalLine));
+        return failure(parserError(messages.first, normalised.originalLine));
     if (cmsIT8TableCount(handle.get()) < 1)
         return failure(syntaxError(0, "the file holds no data table"));
     return extract(handle.get(), normalised, options);
