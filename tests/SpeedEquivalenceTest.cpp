@@ -72,7 +72,7 @@ struct FitRun {
 
 bool sameBytes(const void* first, const void* second, size_t size)
 {
-    return std::memcmp(first, second, size) == 0;
+    return size == 0 || std::memcmp(first, second, size) == 0;
 }
 
 // Runs both fits and requires identical results; returns the fast run.
