@@ -188,8 +188,8 @@ TEST(CommandLine, ChartOfAShuffledFormEqualsTheLibrarysChart)
     ToolRun run = runTool({"chart", "form.txt", "-o", "chart.txt"}, dir.dir());
     expectSuccess(run);
     expectSameFile(dir.path("chart.txt"), "offset-form.p0.chart");
-    EXPECT_TRUE(contains(run.out, "46 test-form patches found, 1 of them averaged over repeated measurements; "
-                                  "1 other measurements ignored"))
+    EXPECT_TRUE(contains(run.out, "46 test-form patches found in 47 measurements (repeated measurements averaged "
+                                  "for 1 of them); 1 other measurements ignored"))
         << run.out;
     EXPECT_TRUE(contains(run.out, "gray difference factor  C -0.04  M -0.03  Y -0.02  K 0.03")) << run.out;
     EXPECT_TRUE(contains(run.out, "coverage limit          96 %")) << run.out;
@@ -464,7 +464,9 @@ TEST(CommandLine, RealMeasuredDataSet)
     const ToolRun run = runTool({"chart", path, "-o", "chart.txt"}, dir.dir());
     expectSuccess(run);
     EXPECT_TRUE(contains(run.out, "1617 measurements")) << run.out;
-    EXPECT_TRUE(contains(run.out, "46 test-form patches found, 22 of them averaged")) << run.out;
+    EXPECT_TRUE(contains(run.out, "46 test-form patches found in 68 measurements (repeated measurements averaged "
+                                  "for 22 of them)"))
+        << run.out;
     EXPECT_EQ(parse(dir.path("chart.txt")).sets.size(), 900u);
     // The model predicted from 46 patches against 720 measured chart
     // combinations of the same press (APTEC PC10 data).

@@ -44,9 +44,9 @@ TestForm readTestForm(const std::string& path, const ReadOptions& read, std::ost
 
     out << "form: " << path << ": " << form.file.sets.size() << " measurements, " << form.file.layout.describe()
         << ", reflectance 0-" << number(form.file.scale) << (form.file.scaleDetected ? " (detected)" : " (given)")
-        << "\n  46 test-form patches found";
+        << "\n  46 test-form patches found in " << form.picked.setsUsed << " measurements";
     if (form.picked.averaged > 0)
-        out << ", " << form.picked.averaged << " of them averaged over repeated measurements";
+        out << " (repeated measurements averaged for " << form.picked.averaged << " of them)";
     out << "; " << form.picked.setsIgnored << " other measurements ignored\n";
     return form;
 }
