@@ -20,5 +20,9 @@ write_basic_package_version_file(${PROJECT_BINARY_DIR}/VeltmarquistDLLConfigVers
 install(FILES ${PROJECT_BINARY_DIR}/VeltmarquistDLLConfig.cmake
   ${PROJECT_BINARY_DIR}/VeltmarquistDLLConfigVersion.cmake DESTINATION ${VELTMARQUIST_CMAKE_DIR})
 
+# The .pc file finds its prefix from its own place, so the package can be
+# installed with any --prefix.
+file(RELATIVE_PATH VELTMARQUIST_PC_TO_PREFIX ${CMAKE_INSTALL_FULL_LIBDIR}/pkgconfig ${CMAKE_INSTALL_PREFIX})
+string(REGEX REPLACE "/$" "" VELTMARQUIST_PC_TO_PREFIX "${VELTMARQUIST_PC_TO_PREFIX}")
 configure_file(cmake/VeltmarquistDLL.pc.in ${PROJECT_BINARY_DIR}/VeltmarquistDLL.pc @ONLY)
 install(FILES ${PROJECT_BINARY_DIR}/VeltmarquistDLL.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)

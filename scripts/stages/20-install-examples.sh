@@ -25,13 +25,12 @@ done
 cmake -S examples/c-host -B "$prefix/c-host" -G Ninja -DCMAKE_PREFIX_PATH="$prefix" >/dev/null
 cmake --build "$prefix/c-host" >/dev/null
 "$prefix/c-host/c_host" samples/offset_form.txt "$prefix/c-host.chart"
-# ... and through pkg-config (the .pc file names the configured prefix;
-# --define-prefix takes the prefix from where the file lies).
+# ... and through pkg-config (the .pc file finds its prefix from where it lies).
 pc=$(dirname "$(find "$prefix" -name VeltmarquistDLL.pc | head -n 1)")
 libdir=$(dirname "$library")
 # shellcheck disable=SC2046
 cc -std=c99 -Wall -Wextra -Werror examples/c-host/main.c -o "$prefix/c-host-pkg" \
-  $(PKG_CONFIG_PATH="$pc" pkg-config --define-prefix --cflags --libs VeltmarquistDLL) -lm -Wl,-rpath,"$libdir"
+  $(PKG_CONFIG_PATH="$pc" pkg-config --cflags --libs VeltmarquistDLL) -lm -Wl,-rpath,"$libdir"
 "$prefix/c-host-pkg" samples/offset_form.txt "$prefix/c-host-pkg.chart"
 
 python3 examples/python-host/python_host.py --library "$library" samples/offset_form.txt "$prefix/python-host.chart"
