@@ -10,6 +10,7 @@
 #include <map>
 #include <sstream>
 #include <string>
+#include <unistd.h>
 
 using namespace testsupport;
 
@@ -121,14 +122,20 @@ void ChartConversion(benchmark::State& state)
 }
 BENCHMARK(ChartConversion)->DenseRange(7, 9)->Unit(benchmark::kMicrosecond);
 
-// Console output as usual, plus the times of every run by name.
+// Console output as usual, plus the times of every benchmark by name: of its
+// run, or the median of its repetitions when there are several.
 class RatioReporter : public benchmark::ConsoleReporter {
 public:
+    explicit RatioReporter(OutputOptions options) : ConsoleReporter(options) {}
+
     void ReportRuns(const std::vector<Run>& runs) override
     {
-        for (const Run& run : runs)
-            if (run.run_type == Run::RT_Iteration && !run.error_occurred)
+        for (const Run& run : runs) {
+            const bool single = run.run_type == Run::RT_Iteration && run.repetitions <= 1;
+            const bool median = run.run_type == Run::RT_Aggregate && run.aggregate_name == "median";
+            if ((single || median) && !run.error_occurred)
                 times_[run.run_name.function_name] = {run.GetAdjustedRealTime(), run.GetAdjustedCPUTime()};
+        }
         ConsoleReporter::ReportRuns(runs);
     }
     void printRatio(const std::string& slow, const std::string& fast) const
@@ -150,7 +157,7 @@ int main(int argc, char** argv)
     benchmark::Initialize(&argc, argv);
     if (benchmark::ReportUnrecognizedArguments(argc, argv))
         return 1;
-    RatioReporter reporter;
+    RatioReporter reporter(isatty(STDOUT_FILENO) ? RatioReporter::OO_Defaults : RatioReporter::OO_Tabular);
     benchmark::RunSpecifiedBenchmarks(&reporter);
     reporter.printRatio("Process0_Members/straightforward", "Process0_Members/fast");
     reporter.printRatio("Process0_Members/straightforward", "Process0_CalculateChart");
