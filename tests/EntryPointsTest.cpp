@@ -5,7 +5,6 @@
 // that both halves are replaced and warns at every inlined delete.
 #pragma GCC diagnostic ignored "-Wmismatched-new-delete"
 #endif
-#include "ScratchAllocation.h"
 #include "TestSupport.h"
 
 #include <gtest/gtest.h>
@@ -95,16 +94,6 @@ TEST(Profile, ConstructionValues)
     EXPECT_FALSE(profile.chartFile.is_open());
 }
 
-TEST(Profile, NamesAreStoredWholeUpTo1023Characters)
-{
-    const std::string fits(1023, 'n');
-    MathProfile whole(fits.c_str());
-    EXPECT_EQ(std::string(whole.profileName), fits);
-    const std::string longer(5000, 'x');
-    MathProfile cut(longer.c_str());
-    EXPECT_EQ(std::string(cut.profileName), longer.substr(0, 1023));
-}
-
 TEST(Profile, VersionSymbols)
 {
     EXPECT_STREQ(VeltmarquistDLLVersionString, "@(#)PROGRAM:VeltmarquistDLL  PROJECT:Pellinore_AllModules-1\n");
@@ -170,107 +159,6 @@ TEST(Marshalling, BandPlacementOfBothKinds)
         EXPECT_DOUBLE_EQ(shifted[b], tenBands[b - 2] / 1000.0) << b;
     for (int b = 10; b < 36; ++b)
         EXPECT_EQ(shifted[b], 0.095) << b;
-}
-
-TEST(Statuses, UnknownInputKindComesFirstAndKeepsTheProfile)
-{
-    TempDir dir;
-    MeasurementBlock block = readGoldenInput("conversion.in");
-    void* profile = CreateMathProfile("kind");
-    for (int process : {0, 1, 3, 5, 6, 7, 8, 9}) {
-        MeasurementBlock bad = block;
-        bad.inputKind = 15;
-        bad.count = -4; // would be status 4, but the kind is checked first
-        EXPECT_EQ(calculate(profile, process, dir.path("k.txt"), bad), VM_STATUS_UNKNOWN_INPUT_KIND);
-        EXPECT_EQ(CalculateChart(nullptr, VM_PROCESS_CHART_COPY, nullptr, nullptr, 0, 0, 0, 0),
-                  VM_STATUS_UNKNOWN_INPUT_KIND);
-    }
-    EXPECT_FALSE(fileExists(dir.path("k.txt")));
-    EXPECT_EQ(calculate(profile, 7, dir.path("ok.txt"), block), VM_STATUS_OK);
-    EXPECT_EQ(readFile(dir.path("ok.txt")), readFile(goldenPath("conversion.p7.chart")));
-    DestroyMathProfile(profile);
-}
-
-TEST(Statuses, InvalidMeasurementBlocksAreRejectedBeforeAnythingIsWritten)
-{
-    TempDir dir;
-    const MeasurementBlock good = readGoldenInput("conversion.in");
-    void* profile = CreateMathProfile("invalid");
-    const std::string out = dir.path("never.txt");
-    struct Case {
-        const char* what;
-        int process;
-        void (*change)(MeasurementBlock&);
-    };
-    const Case cases[] = {
-        {"count 1 for process 7", 7, [](MeasurementBlock& b) { b.count = 1; }},
-        {"count 0", 7, [](MeasurementBlock& b) { b.count = 0; }},
-        {"count 2000", 7, [](MeasurementBlock& b) { b.count = 2000; }},
-        {"count 45 for process 0", 0, [](MeasurementBlock& b) { b.count = 45; }},
-        {"count 45 for process 1", 1, [](MeasurementBlock& b) { b.count = 45; }},
-        {"count 45 for process 10", 10, [](MeasurementBlock& b) { b.count = 45; }},
-        {"count 9 for process 3", 3, [](MeasurementBlock& b) { b.count = 9; }},
-        {"count 10 for process 5", 5, [](MeasurementBlock& b) { b.count = 10; }},
-        {"no values per patch", 7, [](MeasurementBlock& b) { b.valuesPerPatch = 0; }},
-        {"101 values per patch", 7, [](MeasurementBlock& b) { b.valuesPerPatch = 101; }},
-        {"first band at 750 nm", 7, [](MeasurementBlock& b) { b.firstWavelength = 750; }},
-        {"37 bands from 390 nm", 7, [](MeasurementBlock& b) { b.firstWavelength = 390; b.valuesPerPatch = 37; }},
-        {"every band below 380 nm", 7, [](MeasurementBlock& b) { b.firstWavelength = 300; b.valuesPerPatch = 8; }},
-        {"16-band kind with 36 values", 7, [](MeasurementBlock& b) { b.inputKind = VM_INPUT_16BAND; }},
-        {"process 6 without ramps", 6, [](MeasurementBlock&) {}},
-    };
-    for (const Case& c : cases) {
-        MeasurementBlock block = good;
-        c.change(block);
-        EXPECT_EQ(calculate(profile, c.process, out, block), VM_STATUS_INVALID_MEASUREMENTS) << c.what;
-        EXPECT_FALSE(fileExists(out)) << c.what;
-    }
-    MeasurementBlock block = good;
-    EXPECT_EQ(CalculateChart(nullptr, VM_PROCESS_CHART_COPY, out.c_str(), block.ints.data(), 10, 380, 36, 32),
-              VM_STATUS_INVALID_MEASUREMENTS);
-    EXPECT_EQ(CalculateChart(profile, VM_PROCESS_CHART_COPY, nullptr, block.ints.data(), 10, 380, 36, 32),
-              VM_STATUS_INVALID_MEASUREMENTS);
-    EXPECT_EQ(CalculateChart(profile, VM_PROCESS_CHART_COPY, out.c_str(), nullptr, 10, 380, 36, 32),
-              VM_STATUS_INVALID_MEASUREMENTS);
-    // The profile is still alive and gives the same bytes as a fresh one.
-    EXPECT_EQ(calculate(profile, 8, dir.path("ok.txt"), block), VM_STATUS_OK);
-    EXPECT_EQ(readFile(dir.path("ok.txt")), readFile(goldenPath("conversion.p8.chart")));
-    DestroyMathProfile(profile);
-}
-
-TEST(Statuses, UnopenableChartFileGivesStatusOneAndNoFile)
-{
-    TempDir dir;
-    const struct {
-        int process;
-        const char* input;
-    } runs[] = {{VM_PROCESS_GRAVURE, "offset-form.in"}, {VM_PROCESS_SIX_COLOUR, "multichannel.in"},
-                {VM_PROCESS_CHART_BLEND, "conversion.in"}};
-    for (const auto& run : runs) {
-        MeasurementBlock block = readGoldenInput(run.input);
-        const std::vector<int> before = block.ints;
-        const std::string path = dir.path("missing/folder/chart.txt");
-        // The library destroys the profile on this status: no Destroy call.
-        EXPECT_EQ(calculate(CreateMathProfile("gone"), run.process, path, block), VM_STATUS_FILE_NOT_OPENED)
-            << run.process;
-        EXPECT_FALSE(fileExists(path));
-        EXPECT_EQ(block.ints, before) << "the exchange buffer is untouched";
-        EXPECT_EQ(calculate(CreateMathProfile("folder"), run.process, dir.dir(), block), VM_STATUS_FILE_NOT_OPENED)
-            << "a folder is no chart file";
-    }
-}
-
-TEST(Statuses, AllocationFailureKeepsTheProfile)
-{
-    TempDir dir;
-    MeasurementBlock block = readGoldenInput("conversion.in");
-    void* profile = CreateMathProfile("memory");
-    const auto previous = scratch::setAllocator([](std::size_t, std::size_t) -> void* { return nullptr; });
-    EXPECT_EQ(calculate(profile, 7, dir.path("m.txt"), block), VM_STATUS_OUT_OF_MEMORY);
-    scratch::setAllocator(previous);
-    EXPECT_FALSE(fileExists(dir.path("m.txt")));
-    EXPECT_EQ(calculate(profile, 7, dir.path("m.txt"), block), VM_STATUS_OK);
-    DestroyMathProfile(profile);
 }
 
 TEST(Statuses, ACalculationThatThrowsGivesStatusThree)

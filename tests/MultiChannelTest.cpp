@@ -279,14 +279,3 @@ TEST(MultiChannelChart, OtherProcessesWriteOnlyTheEnd)
         EXPECT_TRUE(list.empty());
 }
 
-TEST(MultiChannelChart, SeparatedSetNeedsTheRampsOfAPrecedingChart)
-{
-    TempDir dir;
-    MeasurementBlock block = readGoldenInput("multichannel.in");
-    void* profile = CreateMathProfile("no ramps");
-    EXPECT_EQ(calculate(profile, VM_PROCESS_SEPARATED_SET, dir.path("x.txt"), block), VM_STATUS_INVALID_MEASUREMENTS);
-    EXPECT_FALSE(fileExists(dir.path("x.txt")));
-    ASSERT_EQ(calculate(profile, VM_PROCESS_SIX_COLOUR, dir.path("s.txt"), block), VM_STATUS_OK);
-    EXPECT_EQ(readFile(dir.path("s.txt")), readFile(goldenPath("multichannel.p3.chart")));
-    DestroyMathProfile(profile);
-}
