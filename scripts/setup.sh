@@ -6,7 +6,8 @@ set -euo pipefail
 packages=(build-essential cmake ninja-build pkg-config
           libgtest-dev libgmock-dev libbenchmark-dev
           liblcms2-dev libcli11-dev
-          clang libclang-rt-14-dev valgrind python3)
+          clang libclang-rt-14-dev valgrind python3
+          llvm-14)  # llvm-symbolizer: sanitizer reports with file and line
 
 missing=()
 for package in "${packages[@]}"; do
