@@ -279,16 +279,19 @@ void GridEvaluator::selectLimit(int limit)
     // Any black factor will do: threeColourGreyIgnoresBlack.
     fillRow(t.black3, inputs_->dot[0][3], exponent(0, 3, kBlackAxis.at(0), percent));
 
+    // Lane tables; padding lanes repeat the last factor.
     InkRow row;
     for (int l = 0; l < kYellowLanes; ++l) {
-        fillRow(row, inputs_->dot[0][2], exponent(0, 2, kYellowAxis.at(l < kYellowCount ? l : kYellowCount - 1), percent));
+        const int factor = kYellowAxis.at(l < kYellowCount ? l : kYellowCount - 1);
+        fillRow(row, inputs_->dot[0][2], exponent(0, 2, factor, percent));
         for (int j = 0; j < kBands; ++j) {
             t.yellow3.a[j][l] = row.a[j];
             t.yellow3.n[j][l] = row.n[j];
         }
     }
     for (int l = 0; l < kBlackLanes; ++l) {
-        fillRow(row, inputs_->dot[1][3], exponent(1, 3, kBlackAxis.at(l < kBlackCount ? l : kBlackCount - 1), percent));
+        const int factor = kBlackAxis.at(l < kBlackCount ? l : kBlackCount - 1);
+        fillRow(row, inputs_->dot[1][3], exponent(1, 3, factor, percent));
         for (int j = 0; j < kBands; ++j) {
             t.black4.a[j][l] = row.a[j];
             t.black4.n[j][l] = row.n[j];
