@@ -38,10 +38,17 @@
 // The lane loops are built for the baseline instruction set and, on x86-64,
 // also for AVX2 and AVX-512, chosen at load time. All give the same bits:
 // only the vector width differs, and contraction into fused multiply-add is
-// off for every target. Address-sanitized builds keep the baseline version
-// alone, since load-time selection runs before the sanitizer is set up.
-#if defined(__x86_64__) && defined(__has_attribute)
-#if __has_attribute(target_clones) && !defined(__SANITIZE_ADDRESS__)
+// off for every target. Sanitized builds keep the baseline version alone:
+// load-time selection runs before the sanitizer runtime is set up.
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#define GRAYFIT_SANITIZED
+#elif defined(__has_feature)
+#if __has_feature(address_sanitizer) || __has_feature(thread_sanitizer)
+#define GRAYFIT_SANITIZED
+#endif
+#endif
+#if defined(__x86_64__) && defined(__has_attribute) && !defined(GRAYFIT_SANITIZED)
+#if __has_attribute(target_clones)
 #define GRAYFIT_LANE_LOOP __attribute__((target_clones("avx512f", "avx2", "default")))
 #endif
 #endif
