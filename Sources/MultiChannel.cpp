@@ -129,19 +129,26 @@ const std::array<std::array<unsigned char, 4>, 3500> MathProfile::ZANExtended = 
 
 void MathProfile::buildTintRamps()
 {
-    const double* W = patchSlots[kSlotPaper].spectrum;
+    // Each band of every tone is (W^(1/3) a + S^(1/3) b)^3. The cube roots of
+    // paper and solids do not depend on the tone, so they are taken once: the
+    // same pow calls on the same operands, hence the same bits, 101 times fewer.
+    // The general power function, not cbrt: a negative reflectance gives NaN
+    // rather than a negative root.
+    double paperRoot[kBands], solidRoot[kChannels][kBands];
+    for (int j = 0; j < kBands; ++j) {
+        paperRoot[j] = std::pow(patchSlots[kSlotPaper].spectrum[j], 1.0 / 3.0);
+        for (int c = 0; c < kChannels; ++c)
+            solidRoot[c][j] = std::pow(patchSlots[kSlotFirstTint + c].spectrum[j], 1.0 / 3.0);
+    }
     ColorPatch& scratch = patchSlots[kSlotCurrentSample];
     for (int i = 0; i <= 100; ++i) {
         const double a = (100 - i) / 100.0;
         const double b = i / 100.0;
         for (int c = 0; c < kChannels; ++c) {
-            const double* S = patchSlots[kSlotFirstTint + c].spectrum;
             for (int k = 0; k < kChannels; ++k)
                 scratch.channel[k] = k == c ? i : 0.0;
-            // The general power function, not cbrt: a negative reflectance
-            // gives NaN rather than a negative root.
             for (int j = 0; j < kBands; ++j)
-                scratch.spectrum[j] = std::pow(std::pow(W[j], 1.0 / 3.0) * a + std::pow(S[j], 1.0 / 3.0) * b, 3.0);
+                scratch.spectrum[j] = std::pow(paperRoot[j] * a + solidRoot[c][j] * b, 3.0);
             tintLists[c].push_back(scratch);
         }
     }
