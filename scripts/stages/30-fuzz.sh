@@ -29,7 +29,8 @@ export UBSAN_OPTIONS=print_stacktrace=1:halt_on_error=1
 mkdir -p "$build/artifacts"
 
 # fuzz <name> <seed folder>...: fuzzes into a working corpus kept in the
-# build folder, so that later runs start where earlier ones stopped.
+# build folder, so that later runs start where earlier ones stopped; words
+# in fuzz/<name>.dict guide the mutations.
 fuzz() {
   local name=$1; shift
   local corpus="$build/corpus/$name"
@@ -37,8 +38,10 @@ fuzz() {
   for folder in "$@" "fuzz/regressions/$name"; do
     [ -d "$folder" ] && [ -n "$(ls -A "$folder")" ] && seeds+=("$folder")
   done
+  local options=()
+  [ -e "fuzz/$name.dict" ] && options+=("-dict=fuzz/$name.dict")
   mkdir -p "$corpus"
-  "$build/fuzz/fuzz_$(tr - _ <<<"$name")" "$corpus" "${seeds[@]}" \
+  "$build/fuzz/fuzz_$(tr - _ <<<"$name")" "$corpus" "${seeds[@]}" "${options[@]}" \
     -max_total_time="$seconds" -timeout=60 -rss_limit_mb=2048 -max_len=65536 \
     -print_final_stats=1 -artifact_prefix="$build/artifacts/$name-" >"$build/$name.log" 2>&1
 }
