@@ -5,11 +5,7 @@ set -euo pipefail
 cd "$(dirname "$0")/../.."
 
 build=build/tsan
-# Functions built for several instruction sets are resolved by the dynamic
-# loader before the ThreadSanitizer runtime has started; their instrumented
-# entry hooks would crash. Without entry and exit hooks every memory access is
-# still checked and a report still names both racing lines.
-flags="-fsanitize=thread -fno-omit-frame-pointer -mllvm -tsan-instrument-func-entry-exit=0"
+flags="-fsanitize=thread -fno-omit-frame-pointer"
 cmake -S . -B "$build" -G Ninja -DCMAKE_BUILD_TYPE=RelWithDebInfo \
   -DCMAKE_C_COMPILER=clang -DCMAKE_CXX_COMPILER=clang++ \
   -DCMAKE_C_FLAGS="$flags" -DCMAKE_CXX_FLAGS="$flags" \
