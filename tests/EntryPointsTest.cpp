@@ -1,5 +1,6 @@
-// The C entry points: profile life, measurement marshalling and band
-// placement, validation of the measurement block, statuses and clean-up.
+// The entry points: a new profile, the widening of 16-band measurements, the
+// band placement of both input kinds, and status 3 for a failing calculation.
+// (Every rejection and clean-up path is in the reliability suite.)
 #if defined(__GNUC__) && !defined(__clang__)
 // operator new is replaced below with malloc/free underneath; GCC cannot see
 // that both halves are replaced and warns at every inlined delete.
@@ -34,131 +35,80 @@ void operator delete(void* memory, std::size_t) noexcept { std::free(memory); }
 
 namespace {
 
-// Runs process 7 on one patch (plus the two reference whites) and returns the
-// 36 values of its row as the chart prints them.
-std::vector<double> placedRow(const std::vector<int>& patchValues, int kind, int first, int perPatch)
+// The 36-band row that CalculateChart builds from one patch of `n` values
+// start, start + 10, ..., read back from a process-7 chart (the patch three
+// times: chart patch and both reference whites).
+std::vector<double> placedRow(int n, int kind, int first)
 {
     std::vector<int> block;
     for (int copy = 0; copy < 3; ++copy)
-        block.insert(block.end(), patchValues.begin(), patchValues.end());
-    block.insert(block.end(), 21, 0); // channel values
+        for (int i = 0; i < n; ++i)
+            block.push_back(5 + 10 * i);
+    block.insert(block.end(), 21, 0);
     TempDir dir;
-    const std::string out = dir.path("rows.txt");
     void* profile = CreateMathProfile("rows");
-    const int status = CalculateChart(profile, VM_PROCESS_CHART_COPY, out.c_str(), block.data(), kind, first, perPatch, 3);
+    EXPECT_EQ(CalculateChart(profile, VM_PROCESS_CHART_COPY, dir.path("r").c_str(), block.data(), kind, first, n, 3),
+              VM_STATUS_OK);
     DestroyMathProfile(profile);
-    EXPECT_EQ(status, VM_STATUS_OK);
-    if (status != VM_STATUS_OK)
-        return {};
-    const auto chartLines = lines(readFile(out));
-    const auto values = fields(chartLines.at(7));
+    const auto values = fields(lines(readFile(dir.path("r"))).at(7));
     std::vector<double> row;
     for (size_t i = 5; i < 41; ++i)
-        row.push_back(std::stod(values.at(i)));
+        row.push_back(std::stod(values.at(i)) * 1000.0);
     return row;
-}
-
-std::vector<int> ramp(int n, int start)
-{
-    std::vector<int> values;
-    for (int i = 0; i < n; ++i)
-        values.push_back(start + 10 * i);
-    return values;
-}
-
-int calculate(void* profile, int process, const std::string& path, MeasurementBlock& block)
-{
-    return CalculateChart(profile, static_cast<PrintProcess>(process), path.c_str(), block.ints.data(),
-                          block.inputKind, block.firstWavelength, block.valuesPerPatch, block.count);
 }
 
 } // namespace
 
-TEST(Profile, ConstructionValues)
+TEST(Profile, ConstructionValuesAndVersion)
 {
     MathProfile profile(nullptr);
-    EXPECT_EQ(profile.profileName[0], '\0');
-    EXPECT_EQ(profile.normFactor, 100.0 / 99.94200000000001);
-    for (double factor : profile.grayDiffFactor)
-        EXPECT_EQ(factor, 0.0);
+    EXPECT_STREQ(profile.profileName, "");
     EXPECT_EQ(profile.rgbFactor[0], 0.9);
-    EXPECT_EQ(profile.rgbFactor[1], 0.85);
     EXPECT_EQ(profile.rgbFactor[2], 0.85);
     EXPECT_EQ(profile.coverageLimit, 200.0);
     EXPECT_EQ(profile.inkOrder, 2);
-    for (const auto& list : profile.tintLists)
-        EXPECT_TRUE(list.empty());
+    EXPECT_EQ(profile.grayDiffFactor[3], 0.0);
     const MathProfile::ColorPatch zero = {};
-    for (const auto& slot : profile.patchSlots)
-        EXPECT_EQ(std::memcmp(&slot, &zero, sizeof zero), 0);
-    EXPECT_FALSE(profile.chartFile.is_open());
-}
-
-TEST(Profile, VersionSymbols)
-{
+    EXPECT_EQ(std::memcmp(&profile.patchSlots[21], &zero, sizeof zero), 0);
+    const std::string longName(1500, 'x');
+    EXPECT_EQ(std::string(MathProfile(longName.c_str()).profileName), longName.substr(0, 1023));
     EXPECT_STREQ(VeltmarquistDLLVersionString, "@(#)PROGRAM:VeltmarquistDLL  PROJECT:Pellinore_AllModules-1\n");
     EXPECT_EQ(VeltmarquistDLLVersionNumber, 1.0);
-    DestroyMathProfile(nullptr); // does nothing
 }
 
-TEST(Marshalling, InterpolateSixteenBands)
+TEST(Marshalling, SixteenBandsAreWidenedTo36)
 {
     MathProfile profile("i");
     double v[16];
     for (int i = 0; i < 16; ++i)
         v[i] = 0.1 * (i + 1) + (i % 3) * 0.013;
-    for (int b : {0, 1, 2, 3})
-        EXPECT_EQ(profile.InterpolateSpectralValue(b, v), v[1]) << b;
+    EXPECT_EQ(profile.InterpolateSpectralValue(0, v), v[1]) << "380-410 nm take the 420 nm value";
+    EXPECT_EQ(profile.InterpolateSpectralValue(3, v), v[1]);
     EXPECT_EQ(profile.InterpolateSpectralValue(4, v), v[1]);
     EXPECT_EQ(profile.InterpolateSpectralValue(5, v), (v[1] + v[2]) * 0.5);
-    EXPECT_EQ(profile.InterpolateSpectralValue(6, v), v[2]);
-    EXPECT_EQ(profile.InterpolateSpectralValue(31, v), (v[14] + v[15]) * 0.5);
-    for (int b : {32, 33, 34, 35})
-        EXPECT_EQ(profile.InterpolateSpectralValue(b, v), v[15]) << b;
+    EXPECT_EQ(profile.InterpolateSpectralValue(32, v), v[15]);
+    EXPECT_EQ(profile.InterpolateSpectralValue(35, v), v[15]);
 }
 
 TEST(Marshalling, BandPlacementOfBothKinds)
 {
-    // 16 bands at 400..700 nm, 20 nm steps.
-    const std::vector<double> k20 = placedRow(ramp(16, 100), VM_INPUT_16BAND, 0, 16);
-    ASSERT_EQ(k20.size(), 36u);
-    for (int b = 0; b < 4; ++b)
-        EXPECT_EQ(k20[b], 0.11) << "380-410 nm take the 420 nm value";
-    for (int b = 4; b <= 32; b += 2)
-        EXPECT_DOUBLE_EQ(k20[b], (100 + 10 * (b / 2 - 1)) / 1000.0) << b;
-    for (int b = 5; b <= 31; b += 2)
-        EXPECT_DOUBLE_EQ(k20[b], (k20[b - 1] + k20[b + 1]) / 2) << b;
-    for (int b = 33; b < 36; ++b)
-        EXPECT_EQ(k20[b], 0.25);
-
-    // 380 nm, 36 bands: copied as they are.
-    const std::vector<double> k10 = placedRow(ramp(36, 5), VM_INPUT_10NM, 380, 36);
-    for (int b = 0; b < 36; ++b)
-        EXPECT_DOUBLE_EQ(k10[b], (5 + 10 * b) / 1000.0);
-
-    // 360 nm, 40 bands: the two bands below 380 nm are skipped.
-    const std::vector<double> wide = placedRow(ramp(40, 5), VM_INPUT_10NM, 360, 40);
-    for (int b = 0; b < 36; ++b)
-        EXPECT_DOUBLE_EQ(wide[b], (5 + 10 * (b + 2)) / 1000.0);
-
-    // 380 nm, 31 bands (to 680 nm): the last five positions stay 0.
-    const std::vector<double> narrow = placedRow(ramp(31, 5), VM_INPUT_10NM, 380, 31);
-    for (int b = 0; b < 31; ++b)
-        EXPECT_DOUBLE_EQ(narrow[b], (5 + 10 * b) / 1000.0);
-    for (int b = 31; b < 36; ++b)
-        EXPECT_EQ(narrow[b], 0.0);
-
-    // 400 nm, 10 bands (to 490 nm): positions in front repeat the first
-    // value, positions from 10 on the last, then the bands are copied from
-    // position 2 on (the last two measured bands fall out).
-    const std::vector<int> tenBands = ramp(10, 5);
-    const std::vector<double> shifted = placedRow(tenBands, VM_INPUT_10NM, 400, 10);
-    EXPECT_EQ(shifted[0], 0.005);
-    EXPECT_EQ(shifted[1], 0.005);
-    for (int b = 2; b < 10; ++b)
-        EXPECT_DOUBLE_EQ(shifted[b], tenBands[b - 2] / 1000.0) << b;
-    for (int b = 10; b < 36; ++b)
-        EXPECT_EQ(shifted[b], 0.095) << b;
+    const auto k20 = placedRow(16, VM_INPUT_16BAND, 0); // 400..700 nm in 20 nm steps
+    for (int b = 0; b < 36; ++b) {
+        const double expected = b < 4 ? 15 : b >= 33 ? 155 : b % 2 == 0 ? 5 + 10 * (b / 2 - 1) : 10 * (b / 2) + 0.0;
+        EXPECT_NEAR(k20[b], expected, 1e-9) << "16 bands, position " << b;
+    }
+    const auto k10 = placedRow(36, VM_INPUT_10NM, 380);
+    const auto wide = placedRow(40, VM_INPUT_10NM, 360);   // 360..750 nm: the first two are skipped
+    const auto narrow = placedRow(31, VM_INPUT_10NM, 380); // 380..680 nm: the rest stays 0
+    const auto shifted = placedRow(10, VM_INPUT_10NM, 400); // 400..490 nm
+    for (int b = 0; b < 36; ++b) {
+        EXPECT_NEAR(k10[b], 5 + 10 * b, 1e-9) << b;
+        EXPECT_NEAR(wide[b], 25 + 10 * b, 1e-9) << b;
+        EXPECT_NEAR(narrow[b], b < 31 ? 5 + 10 * b : 0, 1e-9) << b;
+        // In front the first value, from position 10 on the last, between
+        // them the bands copied from position 2 on.
+        EXPECT_NEAR(shifted[b], b < 2 ? 5 : b < 10 ? 5 + 10 * (b - 2) : 95, 1e-9) << b;
+    }
 }
 
 TEST(Statuses, ACalculationThatThrowsGivesStatusThree)
@@ -168,7 +118,9 @@ TEST(Statuses, ACalculationThatThrowsGivesStatusThree)
     TempDir dir;
     MeasurementBlock block = readGoldenInput("multichannel.in");
     failPatchAllocations = true;
-    const int status = calculate(CreateMathProfile("throws"), VM_PROCESS_SIX_COLOUR, dir.path("x.txt"), block);
+    const int status = CalculateChart(CreateMathProfile("throws"), VM_PROCESS_SIX_COLOUR, dir.path("x").c_str(),
+                                      block.ints.data(), block.inputKind, block.firstWavelength,
+                                      block.valuesPerPatch, block.count);
     failPatchAllocations = false;
     EXPECT_EQ(status, VM_STATUS_CALCULATION_FAILED); // and the profile is gone
 }

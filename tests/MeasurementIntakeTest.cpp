@@ -10,11 +10,6 @@ using namespace testsupport;
 
 namespace {
 
-std::vector<double> spectrumOf(const MathProfile::ColorPatch& patch)
-{
-    return std::vector<double>(patch.spectrum, patch.spectrum + 36);
-}
-
 std::vector<double> keysOf(const std::vector<MathProfile::ColorPatch>& list, int channel)
 {
     std::vector<double> keys;
@@ -23,7 +18,7 @@ std::vector<double> keysOf(const std::vector<MathProfile::ColorPatch>& list, int
     return keys;
 }
 
-MathProfile::ColorPatch tint(int channel, double coverage, double tag)
+MathProfile::ColorPatch tint(int channel, double coverage, double tag = 0.0)
 {
     MathProfile::ColorPatch patch = {};
     patch.channel[channel] = coverage;
@@ -38,45 +33,21 @@ TEST(ReadData, EveryPatchOfTheFormLandsInItsPlace)
     const auto form = syntheticForm();
     RowTable rows(form);
     MathProfile profile("intake");
-    profile.readData(rows.rows());
-
-    // Paper, overprints and greys: slot and source patch.
-    const int slotSource[14] = {6, 8, 28, 20, 22, 24, 26, 42, 2, 12, 18, 44, 45, 1};
-    for (int slot = 0; slot < 14; ++slot) {
-        const int row = slotSource[slot];
-        EXPECT_EQ(spectrumOf(profile.patchSlots[slot]), form[static_cast<size_t>(row)]) << "slot " << slot;
-        for (int c = 0; c < 4; ++c)
-            EXPECT_EQ(profile.patchSlots[slot].channel[c], MathProfile::dithering[row][c]) << "slot " << slot;
-        for (int c = 4; c < 7; ++c)
-            EXPECT_EQ(profile.patchSlots[slot].channel[c], 0.0);
-    }
-    // Tints in reading order, eight per ink.
-    EXPECT_EQ(keysOf(profile.tintLists[0], 0), (std::vector<double>{100, 10, 90, 20, 80, 40, 60, 70}));
-    const int cyanRows[8] = {0, 5, 10, 29, 30, 33, 37, 40};
-    for (int i = 0; i < 8; ++i) {
-        const auto& patch = profile.tintLists[0][static_cast<size_t>(i)];
-        EXPECT_EQ(spectrumOf(patch), form[static_cast<size_t>(cyanRows[i])]);
-        EXPECT_EQ(patch.XYZ[1], 0.0);
-        EXPECT_EQ(patch.weight[0], 0.0);
-    }
-    for (int ink = 0; ink < 4; ++ink) {
-        auto keys = keysOf(profile.tintLists[ink], ink);
-        std::sort(keys.begin(), keys.end());
-        EXPECT_EQ(keys, (std::vector<double>{10, 20, 40, 60, 70, 80, 90, 100})) << "ink " << ink;
-    }
-    for (int ink = 4; ink < 7; ++ink)
-        EXPECT_TRUE(profile.tintLists[ink].empty());
-}
-
-TEST(ReadData, SlotsKeepTheirWeightsAndXYZ)
-{
-    RowTable rows(syntheticForm());
-    MathProfile profile("keep");
-    profile.patchSlots[13].XYZ[1] = 77.0;
-    profile.patchSlots[0].weight[5] = 0.25;
+    profile.patchSlots[13].XYZ[1] = 77.0; // slots keep X, Y, Z and weights
     profile.readData(rows.rows());
     EXPECT_EQ(profile.patchSlots[13].XYZ[1], 77.0);
-    EXPECT_EQ(profile.patchSlots[0].weight[5], 0.25);
+    const int slotSource[14] = {6, 8, 28, 20, 22, 24, 26, 42, 2, 12, 18, 44, 45, 1};
+    for (int slot = 0; slot < 14; ++slot) {
+        const auto& patch = profile.patchSlots[slot];
+        EXPECT_EQ(std::vector<double>(patch.spectrum, patch.spectrum + 36), form[slotSource[slot]]) << slot;
+        for (int c = 0; c < 7; ++c)
+            EXPECT_EQ(patch.channel[c], c < 4 ? MathProfile::dithering[slotSource[slot]][c] : 0) << slot;
+    }
+    // Tints in reading order; the cyan list holds rows 0, 5, 10, 29, 30, 33, 37, 40.
+    EXPECT_EQ(keysOf(profile.tintLists[0], 0), (std::vector<double>{100, 10, 90, 20, 80, 40, 60, 70}));
+    EXPECT_EQ(profile.tintLists[0][3].spectrum[7], form[29][7]);
+    for (int ink = 0; ink < 7; ++ink)
+        EXPECT_EQ(profile.tintLists[ink].size(), ink < 4 ? 8u : 0u);
 }
 
 TEST(ReadData, SwappedHalvesAreExchangedBack)
@@ -89,90 +60,58 @@ TEST(ReadData, SwappedHalvesAreExchangedBack)
     RowTable rows(swapped);
     MathProfile profile("swapped");
     profile.readData(rows.rows());
+    profile.readData(rows.rows()); // the second reading exchanges nothing
     for (int i = 0; i < 46; ++i)
-        EXPECT_EQ(rows.row(i), form[static_cast<size_t>(i)]) << "row " << i;
-    EXPECT_EQ(spectrumOf(profile.patchSlots[13]), form[1]);
+        EXPECT_EQ(rows.row(i), form[i]) << "row " << i;
 
-    // A second reading finds the rows in order and exchanges nothing.
-    profile.readData(rows.rows());
-    for (int i = 0; i < 46; ++i)
-        EXPECT_EQ(rows.row(i), form[static_cast<size_t>(i)]) << "row " << i;
-
-    // 47 rows: all 23 pairs are exchanged, row 22 with row 46 included.
+    // 47 rows: all 23 pairs, row 22 with row 46 included.
     auto longer = form;
     longer.push_back(std::vector<double>(36, 0.333));
     auto swappedLonger = longer;
     for (size_t i = 0; i <= 22; ++i)
         std::swap(swappedLonger[i], swappedLonger[i + 24]);
     RowTable longRows(swappedLonger);
-    MathProfile other("47");
-    other.readData(longRows.rows());
+    profile.readData(longRows.rows());
     for (int i = 0; i < 47; ++i)
-        EXPECT_EQ(longRows.row(i), longer[static_cast<size_t>(i)]) << "row " << i;
+        EXPECT_EQ(longRows.row(i), longer[i]) << "row " << i;
+
+    // Only the first comparison true: no exchange.
+    auto oneYellower = form;
+    std::swap(oneYellower[0], oneYellower[24]);
+    RowTable oneRows(oneYellower);
+    profile.readData(oneRows.rows());
+    EXPECT_EQ(oneRows.row(0), form[24]);
 }
 
-TEST(ReadData, OneYellowerRowIsNoSwap)
-{
-    auto form = syntheticForm();
-    std::swap(form[0], form[24]); // only the first comparison holds
-    RowTable rows(form);
-    MathProfile profile("one");
-    profile.readData(rows.rows());
-    for (int i = 0; i < 46; ++i)
-        EXPECT_EQ(rows.row(i), form[static_cast<size_t>(i)]);
-}
-
-TEST(SortData, OrdersByAscendingCoverage)
+TEST(SortData, AscendingWholeRecordExchangesNotStable)
 {
     MathProfile profile("sort");
-    std::vector<MathProfile::ColorPatch> cyan;
+    std::vector<MathProfile::ColorPatch> cyan, empty, withZero = {tint(6, 5), tint(6, 0), tint(6, 3)};
     for (double key : {100, 10, 90, 20, 80, 40, 60, 70})
         cyan.push_back(tint(0, key, key));
     profile.sortData(cyan);
+    profile.sortData(empty);
+    profile.sortData(withZero);
     EXPECT_EQ(keysOf(cyan, 0), (std::vector<double>{10, 20, 40, 60, 70, 80, 90, 100}));
     EXPECT_EQ(cyan.back().spectrum[0], 100.0) << "whole records move";
-
-    std::vector<MathProfile::ColorPatch> three = {tint(4, 30, 0), tint(4, 10, 0), tint(4, 20, 0)};
-    profile.sortData(three);
-    EXPECT_EQ(keysOf(three, 4), (std::vector<double>{10, 20, 30}));
-
-    std::vector<MathProfile::ColorPatch> empty, one = {tint(1, 50, 7)};
-    profile.sortData(empty);
-    profile.sortData(one);
-    EXPECT_TRUE(empty.empty());
-    EXPECT_EQ(one[0].channel[1], 50.0);
-
-    std::vector<MathProfile::ColorPatch> withZero = {tint(6, 5, 0), tint(6, 0, 0), tint(6, 3, 0)};
-    profile.sortData(withZero);
-    EXPECT_EQ(withZero.front().channel[6], 0.0);
-}
-
-TEST(SortData, IsNotStable)
-{
+    EXPECT_EQ(keysOf(withZero, 6), (std::vector<double>{0, 3, 5}));
     // Equal keys are never exchanged with each other, but an exchange with a
     // third patch reverses them: 2a 2b 1 -> 1 2b 2a.
-    MathProfile profile("unstable");
-    std::vector<MathProfile::ColorPatch> list = {tint(2, 2, 0.1), tint(2, 2, 0.2), tint(2, 1, 0.3)};
-    profile.sortData(list);
-    EXPECT_EQ(list[0].spectrum[0], 0.3);
-    EXPECT_EQ(list[1].spectrum[0], 0.2);
-    EXPECT_EQ(list[2].spectrum[0], 0.1);
+    std::vector<MathProfile::ColorPatch> ties = {tint(2, 2, 0.1), tint(2, 2, 0.2), tint(2, 1, 0.3)};
+    profile.sortData(ties);
+    EXPECT_EQ(ties[1].spectrum[0], 0.2);
+    EXPECT_EQ(ties[2].spectrum[0], 0.1);
 }
 
-TEST(SortData, ReadingTwiceKeepsCopiesSideBySide)
+TEST(SortData, ReadingTwiceKeepsCopiesSideBySideUntilCleared)
 {
     RowTable rows(syntheticForm());
     MathProfile profile("twice");
     profile.readData(rows.rows());
     profile.readData(rows.rows());
-    for (int ink = 0; ink < 4; ++ink) {
-        profile.sortData(profile.tintLists[ink]);
-        const auto keys = keysOf(profile.tintLists[ink], ink);
-        ASSERT_EQ(keys.size(), 16u);
-        for (size_t i = 0; i < 16; i += 2)
-            EXPECT_EQ(keys[i], keys[i + 1]);
-        EXPECT_EQ(keys.back(), 100.0);
-    }
+    profile.sortData(profile.tintLists[3]);
+    EXPECT_EQ(keysOf(profile.tintLists[3], 3),
+              (std::vector<double>{10, 10, 20, 20, 40, 40, 60, 60, 70, 70, 80, 80, 90, 90, 100, 100}));
     profile.clearTintLists();
     for (const auto& list : profile.tintLists)
         EXPECT_TRUE(list.empty());
