@@ -1,12 +1,12 @@
-// The four-colour charts and the chart conversion: golden bytes of the
-// reference charts, the 900-patch table, layout and cut rules, statuses.
+// The four-colour charts and the chart conversion: the reference charts byte
+// for byte, the 900-patch table, layout and cut rules, and the conversion's
+// decisions on degenerate whites.
 #include "TestSupport.h"
 
 #include <gtest/gtest.h>
 
 #include <cmath>
 #include <set>
-#include <sstream>
 
 using namespace testsupport;
 
@@ -16,184 +16,96 @@ namespace {
 std::string chartOf(MeasurementBlock block, int process, MathProfile** keep = nullptr)
 {
     TempDir dir;
-    const std::string out = dir.path("chart.txt");
     void* profile = CreateMathProfile("golden");
-    const int status = CalculateChart(profile, static_cast<PrintProcess>(process), out.c_str(), block.ints.data(),
-                                      block.inputKind, block.firstWavelength, block.valuesPerPatch, block.count);
+    const int status = CalculateChart(profile, static_cast<PrintProcess>(process), dir.path("c").c_str(),
+                                      block.ints.data(), block.inputKind, block.firstWavelength,
+                                      block.valuesPerPatch, block.count);
     EXPECT_EQ(status, VM_STATUS_OK) << "process " << process;
     if (keep != nullptr)
         *keep = static_cast<MathProfile*>(profile);
     else
         DestroyMathProfile(profile);
-    return status == VM_STATUS_OK ? readFile(out) : std::string();
+    return status == VM_STATUS_OK ? readFile(dir.path("c")) : std::string();
 }
 
-} // namespace
-
-TEST(FourColourChart, OffsetProcessMatchesGoldenAndFitsTheGreys)
-{
-    MathProfile* profile = nullptr;
-    EXPECT_EQ(chartOf(readGoldenInput("offset-form.in"), VM_PROCESS_OFFSET, &profile),
-              readFile(goldenPath("offset-form.p0.chart")));
-    ASSERT_NE(profile, nullptr);
-    EXPECT_EQ(profile->grayDiffFactor[0], -0.04);
-    EXPECT_EQ(profile->grayDiffFactor[1], -0.03);
-    EXPECT_EQ(profile->grayDiffFactor[2], -0.02);
-    EXPECT_EQ(profile->grayDiffFactor[3], 0.03);
-    EXPECT_EQ(profile->coverageLimit, 96.0);
-    DestroyMathProfile(profile);
-}
-
-TEST(FourColourChart, SixteenBandInputMatchesGolden)
-{
-    EXPECT_EQ(chartOf(readGoldenInput("offset-form-k20.in"), VM_PROCESS_OFFSET),
-              readFile(goldenPath("offset-form-k20.p0.chart")));
-}
-
-TEST(FourColourChart, GravureProcessMatchesGolden)
-{
-    EXPECT_EQ(chartOf(readGoldenInput("offset-form.in"), VM_PROCESS_GRAVURE),
-              readFile(goldenPath("offset-form.p1.chart")));
-}
-
-TEST(FourColourChart, ProcessesOutsideTheTableRunTheOffsetJob)
-{
-    const std::string offset = readFile(goldenPath("offset-form.p0.chart"));
-    for (int process : {4, -1})
-        EXPECT_EQ(chartOf(readGoldenInput("offset-form.in"), process), offset) << "process " << process;
-}
-
-TEST(ChartConversion, ProcessesSevenEightNineMatchGolden)
-{
-    for (int process : {7, 8, 9})
-        EXPECT_EQ(chartOf(readGoldenInput("conversion.in"), process),
-                  readFile(goldenPath("conversion.p" + std::to_string(process) + ".chart")))
-            << "process " << process;
-}
-
-namespace {
-
-std::string chartEntry(size_t i)
+std::string entry(size_t i)
 {
     const auto& e = MathProfile::toBeCalculated[i];
     return std::to_string(e[0]) + "/" + std::to_string(e[1]) + "/" + std::to_string(e[2]) + "/" + std::to_string(e[3]);
 }
 
-} // namespace
-
-TEST(FourColourChart, TableTellingRows)
+// Spectral value v (5 + i) of data line i of a converted chart.
+double valueOf(const std::vector<std::string>& chart, size_t line, size_t v)
 {
-    const auto& table = MathProfile::toBeCalculated;
-    ASSERT_EQ(table.size(), 900u);
-    EXPECT_EQ(chartEntry(0), "100/0/0/0");
-    EXPECT_EQ(chartEntry(6), "100/100/100/0");
-    EXPECT_EQ(chartEntry(25), "0/0/0/0");
-    EXPECT_EQ(chartEntry(26), "90/0/0/0");
-    EXPECT_EQ(chartEntry(47), "0/0/0/90");
-    EXPECT_EQ(chartEntry(52), "0/0/0/20");
-    EXPECT_EQ(chartEntry(53), "40/100/0/0");
-    EXPECT_EQ(chartEntry(95), "70/40/40/0");
-    EXPECT_EQ(chartEntry(96), "100/90/90/100");
-    EXPECT_EQ(chartEntry(122), "10/10/10/20");
-    EXPECT_EQ(chartEntry(128), "10/10/10/0");
-    EXPECT_EQ(chartEntry(138), "100/100/0/40");
-    EXPECT_EQ(chartEntry(143), "0/40/40/40");
-    EXPECT_EQ(chartEntry(152), "0/40/40/60");
-    EXPECT_EQ(chartEntry(153), "0/0/0/0") << "first grid: yellow, cyan, magenta from 0";
-    EXPECT_EQ(chartEntry(154), "0/10/0/0") << "magenta is the inner loop";
-    EXPECT_EQ(chartEntry(159), "10/0/0/0") << "then cyan";
-    EXPECT_EQ(chartEntry(368), "100/100/100/0");
-    EXPECT_EQ(chartEntry(369), "0/0/0/20");
-    EXPECT_EQ(chartEntry(585), "0/0/0/40");
-    EXPECT_EQ(chartEntry(710), "0/0/0/60");
-    EXPECT_EQ(chartEntry(835), "0/0/0/80");
-    EXPECT_EQ(chartEntry(898), "100/100/100/80");
-    EXPECT_EQ(chartEntry(899), "0/0/0/10");
-    EXPECT_EQ(chartEntry(94), chartEntry(126)) << "patches 95 and 127 repeat";
-    // Only levels the test form measures.
-    const std::set<int> levels = {0, 10, 20, 40, 60, 70, 80, 90, 100};
-    for (const auto& entry : table)
-        for (unsigned char v : entry)
-            EXPECT_TRUE(levels.count(v)) << int(v);
+    return std::stod(fields(chart.at(7 + line)).at(5 + v));
 }
 
-TEST(FourColourChart, LayoutCutAndRepeatedPatches)
+} // namespace
+
+TEST(FourColourChart, ReferenceCharts)
 {
-    const std::string chart = readFile(goldenPath("offset-form.p1.chart"));
-    const auto text = lines(chartOf(readGoldenInput("offset-form.in"), VM_PROCESS_GRAVURE));
+    MathProfile* profile = nullptr;
+    EXPECT_EQ(chartOf(readGoldenInput("offset-form.in"), VM_PROCESS_OFFSET, &profile),
+              readFile(goldenPath("offset-form.p0.chart")));
+    const double fitted[5] = {-0.04, -0.03, -0.02, 0.03, 96};
+    const double left[5] = {profile->grayDiffFactor[0], profile->grayDiffFactor[1], profile->grayDiffFactor[2],
+                            profile->grayDiffFactor[3], profile->coverageLimit};
+    EXPECT_TRUE(std::equal(fitted, fitted + 5, left));
+    DestroyMathProfile(profile);
+    EXPECT_EQ(chartOf(readGoldenInput("offset-form-k20.in"), VM_PROCESS_OFFSET),
+              readFile(goldenPath("offset-form-k20.p0.chart")));
+    const std::string gravure = chartOf(readGoldenInput("offset-form.in"), VM_PROCESS_GRAVURE);
+    EXPECT_EQ(gravure, readFile(goldenPath("offset-form.p1.chart")));
+    // Processes outside the table run the offset job.
+    EXPECT_EQ(chartOf(readGoldenInput("offset-form.in"), -1), readFile(goldenPath("offset-form.p0.chart")));
+
+    // Layout: CR LF only after "IT8", 900 lines of eight values without a
+    // trailing TAB, values cut to two decimals; patch 26 is the paper.
+    const auto text = lines(gravure);
     ASSERT_EQ(text.size(), 908u);
     EXPECT_EQ(text[0], "IT8\r");
-    for (size_t i = 1; i < text.size(); ++i)
-        EXPECT_EQ(text[i].find('\r'), std::string::npos) << "only the first line ends in CR LF";
-    EXPECT_EQ(text[1], "NUMBER_OF_SETS\t900");
     EXPECT_EQ(text[907], "END_DATA");
     for (size_t i = 7; i < 907; ++i) {
         const auto values = fields(text[i]);
-        ASSERT_EQ(values.size(), 8u) << "no trailing TAB: " << text[i];
+        ASSERT_EQ(values.size(), 8u) << text[i];
         EXPECT_EQ(values[0], std::to_string(i - 6));
-        EXPECT_EQ(values[1] + "/" + values[2] + "/" + values[3] + "/" + values[4], chartEntry(i - 7));
-        for (size_t v = 5; v < 8; ++v) {
-            const double value = std::stod(values[v]);
-            EXPECT_EQ(std::floor(value * 100.0 + 0.5) / 100.0, value) << "two decimals at most";
-        }
+        EXPECT_EQ(values[1] + "/" + values[2] + "/" + values[3] + "/" + values[4], entry(i - 7));
+        for (size_t v = 5; v < 8; ++v)
+            EXPECT_EQ(std::round(std::stod(values[v]) * 100.0) / 100.0, std::stod(values[v]));
     }
-    auto tail = [](const std::string& line) { return line.substr(line.find('\t')); };
-    EXPECT_EQ(tail(text[7 + 94]), tail(text[7 + 126]));
+    auto xyz = [](const std::string& line) { return line.substr(line.find('\t', line.find('\t') + 1)); };
+    EXPECT_EQ(xyz(text[7 + 94]), xyz(text[7 + 126])) << "patches 95 and 127 are the same combination";
 }
 
-TEST(FourColourChart, PaperAndSolidsComeOutAsMeasured)
+TEST(FourColourChart, TableTellingRows)
 {
-    MeasurementBlock block = readGoldenInput("offset-form.in");
-    RowTable rows = RowTable::fromBlock(block);
-    auto xyzLine = [](const std::vector<double>& spectrum) {
-        MathProfile probe("probe");
-        MathProfile::ColorPatch patch = {};
-        std::copy(spectrum.begin(), spectrum.end(), patch.spectrum);
-        probe.spec2XYZ(&patch);
-        std::ostringstream line;
-        line.imbue(std::locale::classic());
-        line << std::floor(patch.XYZ[0] * 100) / 100 << '\t' << std::floor(patch.XYZ[1] * 100) / 100 << '\t'
-             << std::floor(patch.XYZ[2] * 100) / 100;
-        return line.str();
-    };
-    const auto text = lines(readFile(goldenPath("offset-form.p0.chart")));
-    const auto gravure = lines(chartOf(block, VM_PROCESS_GRAVURE));
-    auto xyzOf = [](const std::string& line) {
-        const auto v = fields(line);
-        return v[5] + "\t" + v[6] + "\t" + v[7];
-    };
-    EXPECT_EQ(xyzOf(text[7 + 25]), xyzLine(rows.row(1))) << "patch 26 is the paper (offset)";
-    EXPECT_EQ(xyzOf(gravure[7 + 25]), xyzLine(rows.row(1))) << "patch 26 is the paper (gravure)";
-    EXPECT_EQ(xyzOf(text[7]), xyzLine(rows.row(0))) << "patch 1 is the cyan solid";
+    const std::pair<size_t, const char*> telling[] = {
+        {0, "100/0/0/0"},    {25, "0/0/0/0"},       {26, "90/0/0/0"},      {52, "0/0/0/20"},
+        {53, "40/100/0/0"},  {95, "70/40/40/0"},    {96, "100/90/90/100"}, {128, "10/10/10/0"},
+        {138, "100/100/0/40"}, {152, "0/40/40/60"}, {153, "0/0/0/0"},      {154, "0/10/0/0"},
+        {159, "10/0/0/0"},   {369, "0/0/0/20"},     {585, "0/0/0/40"},     {710, "0/0/0/60"},
+        {835, "0/0/0/80"},   {898, "100/100/100/80"}, {899, "0/0/0/10"}};
+    for (const auto& row : telling)
+        EXPECT_EQ(entry(row.first), row.second) << "patch " << row.first + 1;
+    const std::set<int> levels = {0, 10, 20, 40, 60, 70, 80, 90, 100}; // the form's measured steps
+    for (const auto& e : MathProfile::toBeCalculated)
+        for (unsigned char v : e)
+            ASSERT_TRUE(levels.count(v)) << int(v);
 }
 
-TEST(FourColourChart, OnlyOffsetOrGravureMakeTheChart)
+TEST(FourColourChart, OnlyOffsetOrGravureAndIndependentProfiles)
 {
-    TempDir dir;
-    RowTable rows(syntheticForm());
-    MathProfile profile("other");
-    EXPECT_THROW(profile.calculateChart(rows.rows(), VM_PROCESS_SIX_COLOUR, dir.path("c").c_str()),
-                 std::invalid_argument);
-    EXPECT_THROW(profile.calculateChart46(rows.rows(), VM_PROCESS_CHART_COPY, dir.path("c").c_str(), false),
-                 std::invalid_argument);
-    EXPECT_FALSE(fileExists(dir.path("c")));
-    EXPECT_TRUE(profile.tintLists[0].empty()) << "nothing read";
-    try {
-        profile.calculateChart(rows.rows(), VM_PROCESS_OFFSET, dir.path("x/c").c_str());
-        FAIL() << "expected Exceptions";
-    } catch (const Exceptions& failure) {
-        EXPECT_EQ(failure.code, 1);
-    }
-    EXPECT_TRUE(profile.tintLists[0].empty()) << "an unopenable file stops before reading";
-}
-
-TEST(FourColourChart, FreshProfilesAndClearedListsGiveIndependentCharts)
-{
-    // Two gravure charts of different forms on one profile: the second one
-    // selects the first form's tints unless the lists are cleared.
     TempDir dir;
     RowTable first(syntheticForm(0)), second(syntheticForm(2));
     MathProfile reused("reused"), fresh("fresh");
+    EXPECT_THROW(reused.calculateChart(first.rows(), VM_PROCESS_SIX_COLOUR, dir.path("x").c_str()),
+                 std::invalid_argument);
+    EXPECT_THROW(reused.calculateChart46(first.rows(), VM_PROCESS_CHART_COPY, dir.path("x").c_str(), false),
+                 std::invalid_argument);
+    EXPECT_FALSE(fileExists(dir.path("x")));
+    EXPECT_TRUE(reused.tintLists[0].empty()) << "rejected before anything was read";
+    // A second form on one profile selects the first form's tints until the
+    // lists are cleared.
     reused.calculateChart(first.rows(), VM_PROCESS_GRAVURE, dir.path("a").c_str());
     reused.calculateChart(second.rows(), VM_PROCESS_GRAVURE, dir.path("stale").c_str());
     reused.clearTintLists();
@@ -203,101 +115,72 @@ TEST(FourColourChart, FreshProfilesAndClearedListsGiveIndependentCharts)
     EXPECT_EQ(readFile(dir.path("cleared")), readFile(dir.path("fresh")));
 }
 
-TEST(ChartConversion, LayoutAndReferenceHandling)
+TEST(ChartConversion, ReferenceChartsAndEqualWhites)
 {
-    MeasurementBlock block = readGoldenInput("conversion.in");
-    const auto copy = lines(chartOf(block, VM_PROCESS_CHART_COPY));
-    ASSERT_EQ(copy.size(), static_cast<size_t>(block.count - 2 + 8));
-    EXPECT_EQ(copy[0], "LGOROWLENGTH\t54\r");
-    EXPECT_EQ(copy[1], "NUMBER_OF_SETS\t" + std::to_string(block.count - 2));
-    EXPECT_EQ(copy[2], "NUMBER_OF_FIELDS\t41");
-    EXPECT_EQ(fields(copy[4]).size(), 42u) << "41 names, each followed by TAB";
-    for (size_t i = 7; i + 1 < copy.size(); ++i) {
-        const auto values = fields(copy[i]);
-        ASSERT_EQ(values.size(), 42u);
-        EXPECT_EQ(values.back(), "") << "data lines end with TAB";
-    }
-
-    // Both whites equal: process 8 gives the measured rows, process 9 blends
-    // with w = 0.33 (r 0.33 + 0.67 r), equal up to rounding.
-    MeasurementBlock same = block;
-    const int stride = block.valuesPerPatch;
-    for (int j = 0; j < stride; ++j)
-        same.ints[static_cast<size_t>((block.count - 1) * stride + j)] =
-            same.ints[static_cast<size_t>((block.count - 2) * stride + j)];
-    const auto converted = lines(chartOf(same, VM_PROCESS_CHART_CONVERT));
-    for (size_t i = 7; i + 1 < converted.size(); ++i) {
-        const auto a = fields(converted[i]), b = fields(copy[i]);
-        for (size_t v = 5; v < 41; ++v)
-            EXPECT_EQ(std::stod(a[v]), std::max(std::stod(b[v]), 0.0)) << "negative values become 0";
-    }
-    const auto blended = lines(chartOf(same, VM_PROCESS_CHART_BLEND));
-    for (size_t i = 7; i + 1 < blended.size(); ++i) {
-        const auto a = fields(blended[i]), b = fields(copy[i]);
-        for (size_t v = 5; v < 41; ++v)
-            EXPECT_NEAR(std::stod(a[v]), std::stod(b[v]), 1e-5 + 1e-5 * std::stod(b[v]));
-    }
-}
-
-TEST(ChartConversion, ZeroOrNegativeWhiteBands)
-{
-    // First white 0 in band 0: the measured value stands for the converted
-    // one (no inf or nan). A negative first white makes the conversion
-    // negative: written as 0 by process 8.
-    MeasurementBlock block = readGoldenInput("conversion.in");
-    const int stride = block.valuesPerPatch;
-    const size_t firstWhite = static_cast<size_t>((block.count - 2) * stride);
-    block.ints[firstWhite + 0] = 0;
-    block.ints[firstWhite + 1] = -500;
-    const auto converted = lines(chartOf(block, VM_PROCESS_CHART_CONVERT));
-    const auto measured = lines(chartOf(block, VM_PROCESS_CHART_COPY));
-    const auto blended = lines(chartOf(block, VM_PROCESS_CHART_BLEND));
-    for (size_t i = 7; i + 1 < converted.size(); ++i) {
-        EXPECT_EQ(fields(converted[i])[5], fields(measured[i])[5]);
-        EXPECT_EQ(std::stod(fields(converted[i])[6]), 0.0);
-        EXPECT_EQ(blended[i].find("nan"), std::string::npos);
-        EXPECT_EQ(blended[i].find("inf"), std::string::npos);
-    }
-}
-
-TEST(ChartConversion, BlendWeightAroundTheJumpAtEleven)
-{
-    // The whites' distance in CIELAB sets the weight of the converted
-    // spectrum: 0.33 up to 11, then 0.33 / ((dE - 10) / 25).
-    MeasurementBlock block = readGoldenInput("conversion.in");
-    const int stride = block.valuesPerPatch;
-    const size_t first = static_cast<size_t>((block.count - 2) * stride);
-    const size_t second = first + static_cast<size_t>(stride);
-    for (int j = 0; j < stride; ++j)
-        block.ints[first + static_cast<size_t>(j)] = 900;
-    MathProfile lab("lab");
-    auto deltaEFor = [&](int level) {
-        MathProfile::ColorPatch a = {}, b = {};
-        for (int j = 0; j < 36; ++j) {
-            a.spectrum[j] = 0.9;
-            b.spectrum[j] = level / 1000.0;
+    for (int process : {7, 8, 9})
+        EXPECT_EQ(chartOf(readGoldenInput("conversion.in"), process),
+                  readFile(goldenPath("conversion.p" + std::to_string(process) + ".chart")));
+    // Both whites equal: process 8 gives the measured rows (negatives as 0),
+    // process 9 blends with w = 0.33: r 0.33 + 0.67 r.
+    MeasurementBlock same = readGoldenInput("conversion.in");
+    const size_t stride = 36, second = static_cast<size_t>(same.count - 1) * stride;
+    std::copy_n(same.ints.begin() + static_cast<long>(second - stride), stride, same.ints.begin() + static_cast<long>(second));
+    const auto copy = lines(chartOf(same, 7)), converted = lines(chartOf(same, 8)), blended = lines(chartOf(same, 9));
+    for (size_t i = 0; i + 2 < static_cast<size_t>(same.count); ++i)
+        for (size_t v = 0; v < 36; ++v) {
+            const double r = valueOf(copy, i, v);
+            EXPECT_EQ(valueOf(converted, i, v), std::max(r, 0.0));
+            EXPECT_NEAR(valueOf(blended, i, v), r, 1e-5 + 1e-5 * std::fabs(r));
         }
-        lab.spec2XYZ(&a);
-        lab.spec2XYZ(&b);
-        const auto la = lab.XYZ2LAB({a.XYZ[0] / 100, a.XYZ[1] / 100, a.XYZ[2] / 100});
-        const auto lb = lab.XYZ2LAB({b.XYZ[0] / 100, b.XYZ[1] / 100, b.XYZ[2] / 100});
-        return std::fabs(la.L - lb.L);
+}
+
+TEST(ChartConversion, ZeroOrNegativeFirstWhite)
+{
+    // A zero band in the first white: the measured value stands for the
+    // converted one. A negative band makes the conversion negative: 0.
+    MeasurementBlock block = readGoldenInput("conversion.in");
+    const size_t firstWhite = static_cast<size_t>(block.count - 2) * 36;
+    block.ints[firstWhite] = 0;
+    block.ints[firstWhite + 1] = -500;
+    const auto converted = lines(chartOf(block, 8)), measured = lines(chartOf(block, 7));
+    const std::string blended = chartOf(block, 9);
+    for (size_t i = 0; i + 2 < static_cast<size_t>(block.count); ++i) {
+        EXPECT_EQ(valueOf(converted, i, 0), valueOf(measured, i, 0));
+        EXPECT_EQ(valueOf(converted, i, 1), 0.0);
+    }
+    EXPECT_EQ(blended.find("nan"), std::string::npos);
+    EXPECT_EQ(blended.find("inf"), std::string::npos);
+}
+
+TEST(ChartConversion, BlendWeightJumpsAboveEleven)
+{
+    // Grey whites: the first at 0.9, the second just below / above a CIELAB
+    // distance of 11. w = 0.33 up to 11, then 0.33 / ((dE - 10) / 25).
+    MeasurementBlock block = readGoldenInput("conversion.in");
+    const size_t first = static_cast<size_t>(block.count - 2) * 36, second = first + 36;
+    std::fill_n(block.ints.begin() + static_cast<long>(first), 36, 900);
+    MathProfile lab("lab");
+    auto deltaE = [&](int level) {
+        MathProfile::lab ends[2];
+        for (int k = 0; k < 2; ++k) {
+            MathProfile::ColorPatch patch = {};
+            std::fill(std::begin(patch.spectrum), std::end(patch.spectrum), (k == 0 ? 900 : level) / 1000.0);
+            lab.spec2XYZ(&patch);
+            ends[k] = lab.XYZ2LAB({patch.XYZ[0] / 100, patch.XYZ[1] / 100, patch.XYZ[2] / 100});
+        }
+        const double dL = ends[0].L - ends[1].L, da = ends[0].a - ends[1].a, db = ends[0].b - ends[1].b;
+        return std::sqrt(dL * dL + da * da + db * db);
     };
-    // Grey second whites just below and above a distance of 11.
-    int below = 900, above = 900;
-    while (deltaEFor(below - 1) <= 11.0)
+    int below = 900;
+    while (deltaE(below - 1) <= 11.0)
         --below;
-    above = below - 1;
-    ASSERT_LE(deltaEFor(below), 11.0);
-    ASSERT_GT(deltaEFor(above), 11.0);
-    auto firstValue = [&](int level) {
-        for (int j = 0; j < stride; ++j)
-            block.ints[second + static_cast<size_t>(j)] = level;
-        return std::stod(fields(lines(chartOf(block, VM_PROCESS_CHART_BLEND))[7])[5]);
-    };
     const double r = block.ints[0] / 1000.0;
-    EXPECT_NEAR(firstValue(below), r / 0.9 * (below / 1000.0) * 0.33 + 0.67 * r, 1e-5);
-    const double w = 0.33 / ((deltaEFor(above) - 10) / 25);
-    EXPECT_GT(w, 7.0);
-    EXPECT_NEAR(firstValue(above), r / 0.9 * (above / 1000.0) * w + (1 - w) * r, 1e-4);
+    for (int level : {below, below - 1}) {
+        std::fill_n(block.ints.begin() + static_cast<long>(second), 36, level);
+        const double dE = deltaE(level);
+        const double w = dE <= 11.0 ? 0.33 : 0.33 / ((dE - 10) / 25);
+        EXPECT_NEAR(valueOf(lines(chartOf(block, 9)), 0, 0), r / 0.9 * (level / 1000.0) * w + (1 - w) * r, 1e-4)
+            << "dE " << dE << " w " << w;
+        EXPECT_EQ(w > 7.0, level < below) << "the weight jumps to about 8 just above 11";
+    }
 }
