@@ -86,20 +86,6 @@ TEST(GrayFit, WholeHundredthsWithinBoundsRepeatableAndCloser)
     EXPECT_TRUE(std::equal(first, first + 5, second));
 }
 
-TEST(GrayFit, NonFiniteMeasurementsKeepTheUncorrectedModel)
-{
-    auto form = syntheticForm();
-    for (double& band : form[44])
-        band = std::nan("");
-    RowTable rows(form);
-    MathProfile profile("nan");
-    profile.grayDiffFactor[1] = 0.5;
-    profile.calculateGrayDiffFactor(rows.rows());
-    for (double factor : profile.grayDiffFactor)
-        EXPECT_EQ(factor, 0.0);
-    EXPECT_EQ(profile.coverageLimit, 200.0);
-}
-
 TEST(RGBFactors, GoldenFitAndChart)
 {
     TempDir dir;
