@@ -20,7 +20,7 @@ cmake -S . -B "$build" -G Ninja -DCMAKE_BUILD_TYPE=RelWithDebInfo \
   -DCMAKE_C_COMPILER=clang -DCMAKE_CXX_COMPILER=clang++ \
   -DCMAKE_C_FLAGS="$flags" -DCMAKE_CXX_FLAGS="$flags" \
   -DVELTMARQUIST_BUILD_TOOLS=OFF -DVELTMARQUIST_BUILD_BENCH=OFF >/dev/null
-targets=(fuzz_calculate_chart chart_seeds)
+targets=(fuzz_calculate_chart)
 [ -e tools/veltmarquist/MeasurementFile.cpp ] && targets+=(fuzz_measurement_file)
 cmake --build "$build" -j2 --target "${targets[@]}"
 
@@ -46,7 +46,7 @@ fuzz() {
     -print_final_stats=1 -artifact_prefix="$build/artifacts/$name-" >"$build/$name.log" 2>&1
 }
 
-fuzz calculate-chart "$build/fuzz/seeds/calculate-chart" & chart=$!
+fuzz calculate-chart fuzz/corpus/calculate-chart & chart=$!
 reader=""
 if [ -e "$build/fuzz/fuzz_measurement_file" ]; then
   fuzz measurement-file fuzz/corpus/measurement-file tests/golden samples & reader=$!

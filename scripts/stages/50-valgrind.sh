@@ -1,21 +1,22 @@
 #!/usr/bin/env bash
-# The veltmarquist tool on every sample under valgrind memcheck, and a small
-# host of the shared library through its failing paths: every run must end
-# with zero memcheck errors and no lost block (definite, indirect, possible).
+# The veltmarquist tool on every sample under valgrind memcheck, and the
+# reliability tests, which take the library through its failing paths
+# (statuses 1, 2, 4 and 5, degenerate input): every run must end with zero
+# memcheck errors and no lost block (definite, indirect, possible).
 # Uses the dev preset's build (VELTMARQUIST_STAGE_BUILD to use another).
 set -euo pipefail
 cd "$(dirname "$0")/../.."
 
 build=${VELTMARQUIST_STAGE_BUILD:-build/dev}
 tool="$build/tools/veltmarquist"
-host="$build/tests/reliability/veltmarquist_memcheck_host"
-for binary in "$tool" "$host"; do
+reliability="$build/tests/reliability/VeltmarquistReliabilityTests"
+for binary in "$tool" "$reliability"; do
   [ -x "$binary" ] || { echo "valgrind: $binary is missing; build $build first" >&2; exit 1; }
 done
 
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
-mkdir -p "$work/logs" "$work/compare" "$work/host"
+mkdir -p "$work/logs" "$work/compare"
 
 # The golden separations (thousandths of a percent) as the separation
 # software's CGATS answer in percent, seven and six channels (six: ink B).
@@ -49,7 +50,7 @@ convert-copy 0 $tool convert samples/chart_two_whites.txt --mode copy -o $work/c
 unwritable-output 8 $tool chart samples/offset_form.txt -o $work/missing-folder/chart.txt
 missing-patches 6 $tool chart samples/chart_two_whites.txt -o $work/none.txt
 no-device-fields 5 $tool chart samples/target_paper.txt -o $work/none.txt
-library-host 0 $host tests/golden $work/host
+reliability-tests 0 $reliability
 RUNS
 )
 

@@ -1,50 +1,74 @@
-// Helpers of the reliability tests: calls through the C entry point with any
-// argument, a snapshot of everything a profile keeps between calls, and the
-// shape of a written chart.
+// Helpers of the reliability tests: calls through the C entry point, the
+// host's separations, complete charts, and a failing scratch allocator.
 #ifndef VELTMARQUIST_RELIABILITYSUPPORT_H
 #define VELTMARQUIST_RELIABILITYSUPPORT_H
 
+#include "ScratchAllocation.h"
 #include "TestSupport.h"
 
-#include <gtest/gtest.h>
-
+#include <algorithm>
+#include <cstdlib>
+#include <sstream>
+#include <stdexcept>
 #include <string>
-#include <vector>
 
 namespace reliability {
 
-using testsupport::MeasurementBlock;
+using namespace testsupport;
 
-// CalculateChart with a plain int as process and the block's own layout.
-int calculate(void* profile, int process, const std::string& path, MeasurementBlock& block);
+inline int calculate(void* profile, int process, const std::string& path, MeasurementBlock& block)
+{
+    return CalculateChart(profile, static_cast<PrintProcess>(process), path.c_str(), block.ints.data(),
+                          block.inputKind, block.firstWavelength, block.valuesPerPatch, block.count);
+}
 
-// Everything a profile carries from one call to the next, byte for byte.
-struct ProfileState {
-    std::vector<unsigned char> bytes;
-    bool operator==(const ProfileState& other) const { return bytes == other.bytes; }
+// A golden input whose exchange records hold the host's golden separations.
+inline MeasurementBlock withSeparations(const std::string& input)
+{
+    MeasurementBlock block = readGoldenInput(input);
+    std::istringstream in(readFile(goldenPath("multichannel.separations")));
+    for (int i = 0; i < VM_EXCHANGE_BUFFER_INTS; ++i)
+        in >> block.ints[static_cast<size_t>(i)];
+    if (!in)
+        throw std::runtime_error("malformed golden separations");
+    return block;
+}
+
+// A profile holding the tone ramps of the golden six-colour chart.
+inline void* primedProfile(const TempDir& dir)
+{
+    MeasurementBlock block = readGoldenInput("multichannel.in");
+    void* profile = CreateMathProfile("primed");
+    if (calculate(profile, VM_PROCESS_SIX_COLOUR, dir.path("primed.txt"), block) != VM_STATUS_OK)
+        throw std::runtime_error("process 3 on the golden multi-channel form failed");
+    return profile;
+}
+
+// Data lines of a chart ending with "END_DATA" and a line feed; -1 otherwise.
+inline int dataLines(const std::string& chart)
+{
+    const size_t data = chart.find("BEGIN_DATA\n");
+    if (data == std::string::npos || chart.rfind("END_DATA\n") + 9 != chart.size())
+        return -1;
+    return static_cast<int>(std::count(chart.begin() + static_cast<long>(data), chart.end(), '\n')) - 2;
+}
+
+// While it lives, the scratch allocator counts the buffers and fails the
+// nth (none for 0).
+class FailingAllocation {
+public:
+    explicit FailingAllocation(int nth) : previous_(scratch::setAllocator(allocate)) { seen_ = 0, nth_ = nth; }
+    ~FailingAllocation() { scratch::setAllocator(previous_); }
+    static int seen() { return seen_; }
+
+private:
+    static void* allocate(std::size_t count, std::size_t size)
+    {
+        return ++seen_ == nth_ ? nullptr : std::calloc(count, size);
+    }
+    static inline int seen_ = 0, nth_ = 0;
+    scratch::Allocator previous_;
 };
-ProfileState stateOf(const void* profile);
-
-// The host's separations of the extended set (golden file), written into the
-// exchange records of `block`.
-void putSeparations(MeasurementBlock& block);
-
-// A profile that holds the tone ramps of a six-colour chart, as process 6
-// needs; its chart goes to `path`.
-void* primedProfile(const std::string& path);
-
-// Data lines between BEGIN_DATA and END_DATA of a chart, or -1 when the chart
-// does not end with "END_DATA" and a line feed (an incomplete file).
-int dataLines(const std::string& chart);
-
-// The first valid call on a profile in each family, with its reference chart
-// (the bytes a fresh profile writes):
-//   process 7 on the conversion chart, cheap, reads no profile state;
-//   process 1 on the test form, reads the tint lists, slots and gravure factors;
-//   process 6 with the golden separations, reads the ramps of a preceding 3.
-enum class FollowUp { ChartCopy, Gravure, SeparatedSet };
-// The chart goes to `path`.
-::testing::AssertionResult servesFollowUp(void* profile, FollowUp followUp, const std::string& path);
 
 } // namespace reliability
 
