@@ -1,67 +1,68 @@
-// Helpers of the tool tests: running the built tool, temporary folders, the
-// golden measurement blocks written as CGATS files, and reading outputs back
-// with the tool's own reader.
+// Golden measurement blocks of the library's tests written as CGATS text.
 #ifndef VELTMARQUIST_TOOLTESTSUPPORT_H
 #define VELTMARQUIST_TOOLTESTSUPPORT_H
 
+#include "../TestSupport.h"
 #include "MeasurementFile.h"
 
-#include <string>
-#include <vector>
+#include <functional>
 
 namespace tooltest {
 
-struct ToolRun {
-    int exitCode = -1;
-    std::string out;
-    std::string err;
-};
-
-// Runs the tool with `arguments` in `folder` (the test's temporary folder).
-ToolRun runTool(const std::vector<std::string>& arguments, const std::string& folder);
-
-class TempDir {
-public:
-    TempDir();
-    ~TempDir();
-    std::string path(const std::string& name) const { return dir_ + "/" + name; }
-    const std::string& dir() const { return dir_; }
-    // Names of the files in the folder, hidden ones included, sorted.
-    std::vector<std::string> files() const;
-
-private:
-    std::string dir_;
-};
-
-std::string readFile(const std::string& path);
-void writeFile(const std::string& path, const std::string& text);
-std::string goldenPath(const std::string& name);
-std::string samplePath(const std::string& name);
-// The evaluation data set beside the project, "" when it is absent.
-std::string realDataPath();
-
-// A golden "*.in" block: kind, first wavelength, values per patch, count, ints.
-struct GoldenBlock {
-    int inputKind = 0, firstWavelength = 0, valuesPerPatch = 0, count = 0;
-    std::vector<int> ints;
-    // Reflectance of value j of patch i, as the file writes it (ints / 1000).
-    std::string value(int patch, int j) const;
-    // Spectral field names of the block's layout (SPECTRAL_NM380 ..., or nm400 ... for 16 bands).
-    std::vector<std::string> spectralFields() const;
-};
-GoldenBlock readGolden(const std::string& name);
-
-// One CGATS data row.
 using Row = std::vector<std::string>;
-// A CGATS.17 text with these fields and rows.
-std::string cgats(const std::vector<std::string>& fields, const std::vector<Row>& rows);
 
-// The golden four-colour form as CGATS rows (SAMPLE_ID, CMYK_C..K, spectra), in measuring order.
-std::vector<Row> testFormRows(const GoldenBlock& block);
-std::vector<std::string> testFormFields(const GoldenBlock& block);
+inline std::string cgats(const Row& fields, const std::vector<Row>& rows)
+{
+    const auto line = [](const Row& items) {
+        std::string text;
+        for (size_t i = 0; i < items.size(); ++i)
+            text += (i ? "\t" : "") + items[i];
+        return text + "\n";
+    };
+    std::string text = "CGATS.17\nNUMBER_OF_FIELDS\t" + std::to_string(fields.size()) + "\nBEGIN_DATA_FORMAT\n" +
+                       line(fields) + "END_DATA_FORMAT\nNUMBER_OF_SETS\t" + std::to_string(rows.size()) +
+                       "\nBEGIN_DATA\n";
+    for (const Row& row : rows)
+        text += line(row);
+    return text + "END_DATA\n";
+}
 
-// Parses a file with the tool's reader; fails the test when it does not parse.
-veltmarquist::MeasurementFile parse(const std::string& path);
+struct Form {
+    Row fields;
+    std::vector<Row> rows;
+    std::string text() const { return cgats(fields, rows); }
+};
+
+// Patches [first, last) of a golden block: fields SAMPLE_ID, `device`, then
+// SPECTRAL_NM380 ... (nm400 ... for 16 bands); rows id, `values(patch)`, spectrum.
+inline Form goldenForm(const testsupport::MeasurementBlock& block, int first, int last, const Row& device,
+                       const std::function<Row(int)>& values)
+{
+    Form form{{"SAMPLE_ID"}, {}};
+    form.fields.insert(form.fields.end(), device.begin(), device.end());
+    for (int j = 0; j < block.valuesPerPatch; ++j)
+        form.fields.push_back(block.inputKind == 20 ? "nm" + std::to_string(400 + 20 * j)
+                                                    : "SPECTRAL_NM" + std::to_string(block.firstWavelength + 10 * j));
+    for (int patch = first; patch < last; ++patch) {
+        form.rows.push_back(values(patch));
+        form.rows.back().insert(form.rows.back().begin(), std::to_string(patch + 1));
+        for (size_t j = 0; j < static_cast<size_t>(block.valuesPerPatch); ++j)
+            form.rows.back().push_back(std::to_string(block.ints[patch * block.valuesPerPatch + j] / 1e3));
+    }
+    return form;
+}
+
+// A golden four-colour form: its 46 patches in measuring order with CMYK fields.
+inline Form goldenForm(const char* name)
+{
+    const Row cmyk{"CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K"};
+    return goldenForm(testsupport::readGoldenInput(name), 0, 46, cmyk, [](int patch) {
+        Row row;
+        for (int channel = 0; channel < 4; ++channel)
+            row.push_back(std::to_string(MathProfile::dithering[patch][channel]));
+        return row;
+    });
+}
 
 } // namespace tooltest
 
