@@ -164,30 +164,20 @@ TempDir::~TempDir()
 std::vector<std::string> lines(const std::string& text)
 {
     std::vector<std::string> result;
-    size_t start = 0;
-    for (size_t i = 0; i < text.size(); ++i)
-        if (text[i] == '\n') {
-            result.push_back(text.substr(start, i - start));
-            start = i + 1;
-        }
-    if (start < text.size())
-        result.push_back(text.substr(start));
+    std::istringstream in(text);
+    for (std::string line; std::getline(in, line);)
+        result.push_back(line);
     return result;
 }
 
 std::vector<std::string> fields(const std::string& line)
 {
     std::vector<std::string> result;
-    std::string current;
-    for (char ch : line) {
-        if (ch == '\t') {
-            result.push_back(current);
-            current.clear();
-        } else {
-            current += ch;
-        }
-    }
-    result.push_back(current);
+    std::istringstream in(line + "\n");
+    for (std::string field; std::getline(in, field, '\t');)
+        result.push_back(field);
+    if (!result.empty() && !result.back().empty())
+        result.back().pop_back(); // the appended line end
     return result;
 }
 
