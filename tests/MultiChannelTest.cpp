@@ -180,44 +180,31 @@ TEST(MultiChannelChart, SeparatedSetReadsThousandthsOfAPercent)
     MeasurementBlock block = readGoldenInput("multichannel.in");
     void* profile = CreateMathProfile("thousandths");
     ASSERT_EQ(calculate(profile, VM_PROCESS_SEVEN_COLOUR, dir.path("s.txt"), block), VM_STATUS_OK);
-    MathProfile* object = static_cast<MathProfile*>(profile);
-
-    // Records 0..6 carry a value in cyan only; the rest are paper.
+    // Record r carries a cyan value only; all other records are paper.
+    // (u + 900) / 1000 truncated: 99 -> 0, 100 -> 1, 50099 -> 50, 50100 -> 51,
+    // -1899 -> 0, -1900 -> -1 and 100100 -> 101 (no ramp patch: unprinted).
+    const int hostValues[] = {99, 100, 50099, 50100, -1899, -1900, 100100, 50000, 1000};
     std::fill(block.ints.begin(), block.ints.end(), 0);
-    const int hostValues[] = {99, 100, 50099, 50100, 100100, -1899, -1900};
-    const double coverage[] = {0, 1, 50, 51, 101, 0, -1};
-    for (int r = 0; r < 7; ++r)
+    for (int r = 0; r < 9; ++r)
         block.ints[static_cast<size_t>(7 * r)] = hostValues[r];
     ASSERT_EQ(calculate(profile, VM_PROCESS_SEPARATED_SET, dir.path("x.txt"), block), VM_STATUS_OK);
+    DestroyMathProfile(profile);
     const auto chart = lines(readFile(dir.path("x.txt")));
     ASSERT_EQ(chart.size(), 7u + 3499u + 1u);
-
-    auto predicted = [&](double cyan) {
-        object->setSample(cyan, 0, 0, 0, 0, 0, 0);
-        object->calcSeparationSample();
-        double xyz[3] = {object->patchSlots[21].XYZ[0], object->patchSlots[21].XYZ[1], object->patchSlots[21].XYZ[2]};
-        std::ostringstream line;
-        line << std::floor(xyz[0] * 100) / 100 << '\t' << std::floor(xyz[1] * 100) / 100 << '\t'
-             << std::floor(xyz[2] * 100) / 100;
-        return line.str();
+    auto xyzOf = [&](int record) {
+        const auto v = fields(chart.at(static_cast<size_t>(7 + record)));
+        return v.at(5) + " " + v.at(6) + " " + v.at(7);
     };
-    auto xyzOf = [](const std::string& line) {
-        const auto v = fields(line);
-        return v.at(5) + "\t" + v.at(6) + "\t" + v.at(7);
-    };
-    for (int r = 0; r < 7; ++r) {
-        const auto values = fields(chart[static_cast<size_t>(7 + r)]);
-        EXPECT_EQ(values[0], std::to_string(r + 1));
-        // The label is the extended combination, whatever the host wrote.
-        const auto& cmyk = MathProfile::ZANExtended[static_cast<size_t>(r)];
-        EXPECT_EQ(values[4], std::to_string(cmyk[3]));
-        EXPECT_EQ(xyzOf(chart[static_cast<size_t>(7 + r)]), predicted(coverage[r])) << hostValues[r];
-    }
-    // Coverages outside 0..100 find no ramp patch: unprinted, the paper.
-    EXPECT_EQ(xyzOf(chart[7 + 4]), predicted(0));
-    EXPECT_EQ(xyzOf(chart[7 + 6]), predicted(0));
-    EXPECT_EQ(xyzOf(chart[7 + 100]), predicted(0));
-    DestroyMathProfile(profile);
+    const std::string paper = xyzOf(100);
+    for (int r : {0, 4, 5, 6})
+        EXPECT_EQ(xyzOf(r), paper) << hostValues[r];
+    EXPECT_EQ(xyzOf(1), xyzOf(8)) << "100 and 1000 are both 1 %";
+    EXPECT_EQ(xyzOf(2), xyzOf(7)) << "50099 is 50 %";
+    EXPECT_NE(xyzOf(3), xyzOf(2)) << "50100 is 51 %";
+    EXPECT_NE(xyzOf(1), paper);
+    // Labels are the extended combinations, whatever the host wrote.
+    const auto record1 = fields(chart[8]);
+    EXPECT_EQ(record1[0] + " " + record1[4], "2 2") << "record 2 is C 0 M 0 Y 0 K 2";
 }
 
 TEST(MultiChannelChart, OtherProcessesWriteOnlyTheEnd)
