@@ -104,6 +104,14 @@ std::array<Cmyk, 900> buildChart()
 
 const std::array<std::array<unsigned char, 4>, 900> MathProfile::toBeCalculated = buildChart();
 
+void MathProfile::predictFourColour(PrintProcess process)
+{
+    if (process == VM_PROCESS_GRAVURE)
+        calcGravureSampleByOrder(inkOrder);
+    else
+        calcOffsetSample();
+}
+
 void MathProfile::calculateChart(double** rows, PrintProcess process, const char* path)
 {
     if (process != VM_PROCESS_OFFSET && process != VM_PROCESS_GRAVURE)
@@ -111,19 +119,14 @@ void MathProfile::calculateChart(double** rows, PrintProcess process, const char
 
     std::ofstream stream;
     chartfile::open(stream, path);
-    readData(rows);
-    for (int list = 0; list < 4; ++list)
-        sortData(tintLists[list]);
+    readForm(rows);
     chartfile::writeXYZHeader(stream, 900);
 
     ColorPatch& sample = patchSlots[kSlotCurrentSample];
     for (size_t i = 0; i < toBeCalculated.size(); ++i) {
         const auto& entry = toBeCalculated[i];
         setSample(entry[0], entry[1], entry[2], entry[3], 0.0, 0.0, 0.0);
-        if (process == VM_PROCESS_GRAVURE)
-            calcGravureSampleByOrder(inkOrder);
-        else
-            calcOffsetSample();
+        predictFourColour(process);
         chartfile::limitY(sample.XYZ);
         chartfile::writeXYZLine(stream, static_cast<int>(i) + 1, sample.channel, sample.XYZ);
     }
@@ -137,9 +140,7 @@ void MathProfile::calculateChart46(double** rows, PrintProcess process, const ch
 
     std::ofstream stream;
     chartfile::open(stream, path);
-    readData(rows);
-    for (int list = 0; list < 4; ++list)
-        sortData(tintLists[list]);
+    readForm(rows);
     chartfile::writeXYZHeader(stream, 46);
 
     ColorPatch& sample = patchSlots[kSlotCurrentSample];
@@ -149,10 +150,8 @@ void MathProfile::calculateChart46(double** rows, PrintProcess process, const ch
             // The rows as readData left them (exchanged when the form was read swapped).
             std::memcpy(sample.spectrum, rows[i], sizeof sample.spectrum);
             spec2XYZ(&sample);
-        } else if (process == VM_PROCESS_GRAVURE) {
-            calcGravureSampleByOrder(inkOrder);
         } else {
-            calcOffsetSample();
+            predictFourColour(process);
         }
         chartfile::limitY(sample.XYZ);
         chartfile::writeXYZLine(stream, i + 1, sample.channel, sample.XYZ);

@@ -84,9 +84,7 @@ void MathProfile::scanGrayGridStraightforward(const lab& grey3, const lab& grey4
 
 void MathProfile::fitGrayDiffFactor(double** rows, bool straightforward)
 {
-    readData(rows);
-    for (int list = 0; list < 4; ++list)
-        sortData(tintLists[list]);
+    readForm(rows);
 
     auto measuredLab = [this](const double* row) {
         ColorPatch patch = {};
@@ -156,9 +154,7 @@ void MathProfile::fitGrayDiffFactor(double** rows, bool straightforward)
 
 void MathProfile::calculateRGBFactors(double** rows)
 {
-    readData(rows);
-    for (int list = 0; list < 4; ++list)
-        sortData(tintLists[list]);
+    readForm(rows);
 
     // Red, green and blue two-ink solids and their measured colours.
     const double requests[3][4] = {{0, 100, 100, 0}, {100, 0, 100, 0}, {100, 100, 0, 0}};

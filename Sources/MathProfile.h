@@ -154,6 +154,11 @@ public:
 private:
     // The gravure model for one ink order, channels i1..i4 of the current sample.
     void calcGravureSample(int i1, int i2, int i3, int i4);
+    // readData, then the four ink lists ordered: how every four-colour
+    // calculation takes in the test form.
+    void readForm(double** rows);
+    // The model of a four-colour process: 1 gravure in inkOrder, else offset.
+    void predictFourColour(PrintProcess process);
     // Runs the gravure method that an ink order selects (as inkOrder does).
     void calcGravureSampleByOrder(int order);
     // The solid of channel `ink` for the offset model: the last patch of its list.

@@ -158,6 +158,13 @@ void MathProfile::sortData(std::vector<ColorPatch>& list)
             }
 }
 
+void MathProfile::readForm(double** rows)
+{
+    readData(rows);
+    for (int list = 0; list < 4; ++list)
+        sortData(tintLists[list]);
+}
+
 void MathProfile::clearTintLists()
 {
     for (auto& list : tintLists)
