@@ -1,0 +1,382 @@
+// The tool's file reader and patch matching in-process; every command end to end against the library's charts.
+#include "../TestSupport.h"
+#include "MeasurementFile.h"
+#include "PatchMatching.h"
+
+#include <gtest/gtest.h>
+
+#include <sys/wait.h>
+
+#include <algorithm>
+#include <filesystem>
+#include <fstream>
+#include <functional>
+#include <random>
+#include <tuple>
+
+using namespace veltmarquist;
+namespace ts = testsupport;
+
+namespace {
+
+using Row = std::vector<std::string>;
+
+// `row` followed by the names prefix + first, prefix + (first + step), ...
+Row names(const std::string& prefix, int first, int step, size_t count, Row row = {})
+{
+    for (size_t j = 0; j < count; ++j)
+        row.push_back(prefix + std::to_string(first + step * static_cast<int>(j)));
+    return row;
+}
+
+std::string cgats(const Row& fields, const std::vector<Row>& rows)
+{
+    const auto line = [](const Row& items) {
+        std::string text;
+        for (const std::string& item : items)
+            text += "\t" + item;
+        return text.substr(1) + "\n";
+    };
+    std::string text = "CGATS.17\nNUMBER_OF_FIELDS\t" + std::to_string(fields.size()) + "\nBEGIN_DATA_FORMAT\n" +
+                       line(fields) + "END_DATA_FORMAT\nNUMBER_OF_SETS\t" + std::to_string(rows.size()) +
+                       "\nBEGIN_DATA\n";
+    for (const Row& row : rows)
+        text += line(row);
+    return text + "END_DATA\n";
+}
+
+struct Form {
+    Row fields;
+    std::vector<Row> rows;
+    std::string text() const { return cgats(fields, rows); }
+};
+
+// Patches [first, last) of a golden block: SAMPLE_ID, `device` (filled by `values`), the bands.
+Form goldenForm(const ts::MeasurementBlock& block, int first, int last, Row device,
+                const std::function<void(int, Row&)>& values)
+{
+    const int n = block.valuesPerPatch;
+    device.insert(device.begin(), "SAMPLE_ID");
+    Form form{block.inputKind == 20 ? names("nm", 400, 20, n, device)
+                                    : names("SPECTRAL_NM", block.firstWavelength, 10, n, device), {}};
+    for (int patch = first; patch < last; ++patch) {
+        form.rows.push_back({std::to_string(patch + 1)});
+        values(patch, form.rows.back());
+        for (int j = 0; j < n; ++j)
+            form.rows.back().push_back(std::to_string(block.ints[patch * n + j] / 1e3));
+    }
+    return form;
+}
+
+// A golden four-colour form: its 46 patches in measuring order with CMYK fields.
+Form goldenForm(const char* name)
+{
+    return goldenForm(ts::readGoldenInput(name), 0, 46, {"CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K"}, [](int patch, Row& row) {
+        for (int channel = 0; channel < 4; ++channel)
+            row.push_back(std::to_string(MathProfile::dithering[patch][channel]));
+    });
+}
+
+// Samples 1 and 2 with CMYK and these spectral fields, every band `value`.
+std::string spectralFile(const char* value = "0.5", const Row& spectral = names("nm", 380, 10, 36))
+{
+    std::vector<Row> rows{{"1", "0", "0", "0", "0"}, {"2", "10", "0", "0", "0"}};
+    for (Row& row : rows)
+        row.insert(row.end(), spectral.size(), value);
+    Row fields{"SAMPLE_ID", "CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K"};
+    fields.insert(fields.end(), spectral.begin(), spectral.end());
+    return cgats(fields, rows);
+}
+
+std::string replaced(std::string text, const std::string& from, const std::string& to)
+{ return text.replace(text.find(from), from.size(), to); }
+
+struct ToolRun { int exitCode; std::string out, err; };
+
+// Runs the built tool in `folder` (no argument holds a quote); what it prints lands beside the folder.
+ToolRun runTool(const std::vector<std::string>& arguments, const std::string& folder)
+{
+    std::string command = "cd '" + folder + "' && '" VELTMARQUIST_TOOL "'";
+    for (const std::string& argument : arguments)
+        command += " '" + argument + "'";
+    const int status = std::system((command + " >'" + folder + ".out' 2>'" + folder + ".err'").c_str());
+    ToolRun run{WIFEXITED(status) ? WEXITSTATUS(status) : -1, ts::readFile(folder + ".out"), ts::readFile(folder + ".err")};
+    std::filesystem::remove(folder + ".out");
+    std::filesystem::remove(folder + ".err");
+    return run;
+}
+
+long files(const std::string& dir) // hidden ones included
+{ return std::distance(std::filesystem::directory_iterator(dir), std::filesystem::directory_iterator()); }
+
+bool contains(const std::string& text, const std::string& part) { return text.find(part) != std::string::npos; }
+
+// A run that succeeded and wrote `written` equal to the `golden` chart (when one is named).
+void expectSuccess(const ToolRun& run, const std::string& written = "", const std::string& golden = "")
+{
+    EXPECT_TRUE(run.exitCode == 0 && run.err.empty()) << run.exitCode << ": " << run.err;
+    EXPECT_TRUE(golden.empty() || ts::readFile(written) == ts::readFile(ts::goldenPath(golden))) << written;
+}
+
+Row clrFields(size_t inks, Row before = {}) { return names(std::to_string(inks) + "CLR_", 1, 1, inks, before); }
+
+// Golden patches: C, M, Y, K solids, paper, three tints the processes ignore, further ink solids.
+std::string multiChannelForm(int inks)
+{
+    return goldenForm(ts::readGoldenInput("multichannel.in"), 0, inks + 4, clrFields(inks), [inks](int patch, Row& row) {
+        const int solidOf[11] = {0, 1, 2, 3, -1, -2, -3, -4, 4, 5, 6};
+        for (int channel = 0; channel < inks; ++channel)
+            row.push_back(channel == solidOf[patch] ? "100" : solidOf[patch] == -channel - 2 ? "50" : "0");
+    }).text();
+}
+
+// Golden separations, `channels` as nCLR_1, ... in percent clamped to 0-100; `exact` marks records unchanged.
+std::string separations(const std::vector<int>& channels, std::vector<bool>& exact)
+{
+    std::ifstream in(ts::goldenPath("multichannel.separations"));
+    std::vector<Row> rows;
+    for (int record = 1; record <= 3499; ++record) {
+        int values[7];
+        bool unchanged = true;
+        for (int channel = 0; channel < 7 && in >> values[channel]; ++channel)
+            unchanged &= values[channel] == (std::count(channels.begin(), channels.end(), channel) ? std::clamp(values[channel], 0, 100000) : 0);
+        rows.push_back({std::to_string(record)});
+        for (int channel : channels)
+            rows.back().push_back(std::to_string(std::clamp(values[channel], 0, 100000) / 1000.0));
+        exact.push_back(unchanged);
+    }
+    return cgats(clrFields(channels.size(), {"SAMPLE_ID"}), rows);
+}
+
+// Patches [first, last) of the golden conversion input: 30 in 7 channels, PAPER_PRINTED, PAPER_TARGET.
+std::string conversionChart(int first, int last)
+{
+    const ts::MeasurementBlock block = ts::readGoldenInput("conversion.in");
+    return goldenForm(block, first, last, clrFields(7, {"SAMPLE_NAME"}), [&block](int patch, Row& row) {
+        row.push_back(patch == 30 ? "PAPER_PRINTED" : patch == 31 ? "PAPER_TARGET" : "P" + std::to_string(patch + 1));
+        for (size_t channel = 0; channel < 7; ++channel)
+            row.push_back(std::to_string(block.ints[static_cast<size_t>(block.count * 36 + 7 * patch) + channel]));
+    }).text();
+}
+
+} // namespace
+
+TEST(MeasurementFile, ReadsInstrumentTextLayoutsAndScalesAndNamesEachDefect)
+{
+    // First line ISO28178, CR LF, trailing TABs, a TABs-only line, unquoted multi-word values, a quoted TAB,
+    // no NUMBER_OF_FIELDS, SPECTRAL_NM_ names, percent reflectance, exponent and signed numbers.
+    std::string text = "ISO28178\t\t\r\n\t\t\t\r\nDESCRIPTOR\tPress 4 coated (front)\t\t\r\nCREATED\tJuly 2023\t\r\n"
+                       "MEASUREMENT_SOURCE\t\"Condition=M1\tFilter=D50\"\t\r\nBEGIN_DATA_FORMAT\t\t\r\nSAMPLE_ID\tCMYK_C"
+                       "\tCMYK_M\tCMYK_Y\tCMYK_K",
+                values = "\t1.5e+01\t+20";
+    for (const std::string& name : names("\tSPECTRAL_NM_", 380, 10, 36))
+        text += name;
+    for (int band = 2; band < 36; ++band)
+        values += "\t87.5";
+    const ReadResult result = readMeasurementText(text + "\t\r\nEND_DATA_FORMAT\r\nNUMBER_OF_SETS\t2\r\nBEGIN_DATA\r\n"
+                                                  "A1\t100\t0\t0\t0" + values + "\t\r\nA2\t0\t0\t0\t0" + values +
+                                                  "\t\r\nEND_DATA\t\t\r\n");
+    ASSERT_TRUE(result.ok()) << result.error.describe();
+    const MeasurementFile& file = *result.file;
+    ASSERT_EQ(file.sets.size(), 2u);
+    EXPECT_EQ(file.keyword("DESCRIPTOR") + "|" + file.keyword("MEASUREMENT_SOURCE") + "|" + file.sets[1].where(),
+              "Press 4 coated (front)|Condition=M1\tFilter=D50|sample A2 (line 12)");
+    EXPECT_EQ(file.sets[0].device, (std::vector<double>{100, 0, 0, 0}));
+    for (const auto& [band, value] : {std::pair{0, 0.15}, {1, 0.20}, {35, 0.875}})
+        EXPECT_DOUBLE_EQ(file.sets[1].reflectance[band], value) << band;
+    const std::pair<Row, const char*> layouts[] = {
+        {names("nm", 380, 10, 36), "36 bands 380-730 nm in 10 nm steps"},
+        {names("SPECTRAL_", 400, 10, 31), "31 bands 400-700 nm in 10 nm steps"},
+        {names("SPECTRAL_NM", 340, 10, 50), "50 bands 340-830 nm in 10 nm steps"},
+        {names("nm", 400, 20, 16), "16 bands 400-700 nm in 20 nm steps"},
+        {names("nm", 380, 5, 71), "unknown spectral layout"}, {names("nm", 420, 20, 15), "unknown spectral layout"},
+        {names("nm", 410, 10, 32), "unknown spectral layout"}, {names("nm", 385, 10, 36), "unknown spectral layout"},
+    };
+    for (const auto& [fields, layout] : layouts) {
+        const ReadResult result = readMeasurementText(spectralFile("0.5", fields));
+        EXPECT_EQ(result.ok() ? result.file->layout.describe() : result.error.message.substr(0, 23), layout);
+    }
+    EXPECT_EQ(readMeasurementText(spectralFile("1.2")).file->scale, 1.0); // brightened paper above 1
+    EXPECT_EQ(readMeasurementText(spectralFile("2.5")).file->scale, 100.0);
+    EXPECT_DOUBLE_EQ(readMeasurementText(spectralFile("1.2"), {100.0}).file->sets[0].reflectance[0], 0.012);
+    const std::string good = spectralFile();
+    EXPECT_TRUE(readMeasurementText(replaced(good, "\n2\t10\t", "\n1\t0\t")).ok()) << "sample 1 measured twice";
+    const std::tuple<std::string, Failure, int, const char*, double> cases[] = {
+        {replaced(good, "\t0.5\n", "\n"), Failure::InputSyntax, 8, "40 values, but 41 fields", 0},
+        {replaced(good, "SETS\t2", "SETS\t3"), Failure::InputSyntax, 6, "says 3, but the data holds 2 sets", 0},
+        {replaced(good, "0.5\nEND", "n/a\nEND"), Failure::InputContent, 9, "field nm730: 'n/a' is not a number", 0},
+        {replaced(good, "\n2\t10\t", "\n2\t110\t"), Failure::InputContent, 9, "CMYK_C: 110 is outside 0-100 %", 0},
+        {replaced(good, "\n2\t10\t", "\n1\t10\t"), Failure::DuplicatePatch, 9, "sample 1 is also on line 8 with", 0},
+        {replaced(good, "CMYK_Y", "CMYK_G"), Failure::InputContent, 0, "CMYK_Y is missing", 0},
+        {spectralFile("87.5"), Failure::InputContent, 8, "see --scale", 1.0},
+        {"CGATS.17\nBEGIN_DATA\n1\nEND_DATA\n", Failure::InputSyntax, 2, "before any BEGIN_DATA_FORMAT", 0},
+        // The CGATS parser would open the named file; the reader takes no file names.
+        {".INCLUDE \"/etc/passwd\"\n" + good, Failure::InputSyntax, 1, "not a CGATS keyword", 0},
+    };
+    for (const auto& [text, kind, line, message, scale] : cases) {
+        const ReadResult result = readMeasurementText(text, {scale});
+        ASSERT_FALSE(result.ok()) << "accepted: " << message;
+        EXPECT_TRUE(result.error.kind == kind && result.error.line == line && contains(result.error.describe(), message))
+            << result.error.describe();
+    }
+}
+
+TEST(PatchMatching, ShuffledFormsAndOtherLayoutsGiveTheLibraryItsBlocks)
+{
+    for (const char* name : {"offset-form.in", "offset-form-k20.in"}) {
+        const ts::MeasurementBlock golden = ts::readGoldenInput(name);
+        Form form = goldenForm(name);
+        // Magenta 0.04 % off is the patch, 0.06 % off another; the paper again with another spectrum; a shuffle.
+        form.rows[17][2] = "89.96";
+        form.rows.push_back(form.rows[17]);
+        form.rows.push_back(form.rows[1]);
+        form.rows[46][0] = "100";
+        form.rows[46][2] = "89.94";
+        form.rows[47][0] = "101";
+        std::fill(form.rows[47].begin() + 5, form.rows[47].end(), "0.5");
+        std::shuffle(form.rows.begin(), form.rows.end(), std::mt19937(46));
+        const ReadResult read = readMeasurementText(form.text());
+        ASSERT_TRUE(read.ok()) << read.error.describe();
+        const PickedPatches picked = pickPatches(*read.file, testFormRequests(), "form.txt");
+        EXPECT_TRUE(picked.averaged == 1 && picked.setsUsed == 47 && picked.setsIgnored == 1) << name;
+        std::vector<Spectrum> spectra;
+        for (const std::vector<double>& reflectance : picked.reflectance)
+            spectra.push_back({&read.file->layout, &reflectance});
+        const MeasurementBlock block = buildBlock(spectra);
+        ASSERT_TRUE(block.inputKind == golden.inputKind && block.ints.size() == 46u * golden.valuesPerPatch) << name;
+        for (size_t i = 0; i < block.ints.size(); ++i) {
+            const bool isPaper = i / golden.valuesPerPatch == 1; // averaged with 0.5 (500)
+            ASSERT_NEAR(block.ints[i], isPaper ? (golden.ints[i] + 501) / 2 : golden.ints[i], isPaper) << name << i;
+        }
+    }
+    const SpectralLayout narrow{400, 10, 31}, sixteen{400, 20, 16};
+    std::vector<double> fine, coarse;
+    for (int j = 0; j < 31; ++j)
+        fine.push_back(0.1 + 0.01 * j);
+    for (int j = 0; j < 16; ++j)
+        coarse.push_back(0.2 + 0.02 * j);
+    // 400-700 nm in 10 nm steps: the bands outside repeat the first and last one.
+    const std::vector<int> ints = buildBlock({{&narrow, &fine}}, 100).ints;
+    EXPECT_EQ(std::vector<int>({ints[0], ints[2], ints[3], ints[32], ints[35], ints[36], ints[99]}),
+              (std::vector<int>{100, 100, 110, 400, 400, 0, 0})); // 380, 400, 410, 700, 730 nm, padding
+    // 16 bands, mixed with 10 nm ones or alone in the rows of the class methods, are widened alike.
+    const MeasurementBlock mixed = buildBlock({{&narrow, &fine}, {&sixteen, &coarse}});
+    RowTable rows(buildBlock({{&sixteen, &coarse}}));
+    EXPECT_TRUE(mixed.inputKind == VM_INPUT_10NM && rows.rows()[1] == nullptr);
+    for (const auto& [band, value] : {std::pair{0, 220}, {5, 230}, {35, 500}}) { // 380 nm takes 420, 430 lies between
+        EXPECT_EQ(mixed.ints[static_cast<size_t>(36 + band)], value) << band;
+        EXPECT_DOUBLE_EQ(rows.rows()[0][band], value / 1000.0) << band;
+    }
+}
+
+TEST(CommandLine, EveryCommandEqualsTheLibrarysCharts)
+{
+    ts::TempDir dir;
+    std::ofstream(dir.path("form.txt")) << goldenForm("offset-form.in").text();
+    const std::tuple<Row, const char*, const char*> cases[] = {
+        {{"chart", "form.txt", "-o", "c.txt"}, "offset-form.p0.chart", "gray difference factor  C -0.04  M -0.03  Y -0.02"},
+        {{"chart", "form.txt", "-o", "c.txt", "--fit-gravure"}, "offset-form.rgb-p1.chart", "red 0.95  green 0.95  blue 1"},
+        {{"chart", "form.txt", "-o", "c.txt", "--process", "gravure"}, "offset-form.p1.chart", "(defaults; --fit-gravure"},
+        // Percent reflectance; the chart combinations measured beyond the test form check the model.
+        {{"chart", VELTMARQUIST_SAMPLES_DIR "/offset_press_sheet.txt", "-o", "c.txt"}, "",
+         "check: 230 chart combinations measured beyond the test form, CIEDE2000 mean 0."},
+    };
+    for (const auto& [arguments, golden, printed] : cases) {
+        const ToolRun run = runTool(arguments, dir.dir());
+        expectSuccess(run, dir.path("c.txt"), golden);
+        EXPECT_TRUE(contains(run.out, printed)) << run.out;
+    }
+    // The 46-step charts, measured and modelled, land in the current folder.
+    const ToolRun run = runTool({"compare", "form.txt", "--process", "gravure"}, dir.dir());
+    expectSuccess(run, dir.path("form.measured46.txt"), "offset-form.c46-measured.chart");
+    expectSuccess(run, dir.path("form.gravure46.txt"), "offset-form.c46-gravure.chart");
+    // Per patch; the paper is the second and the model reproduces it.
+    EXPECT_TRUE(contains(run.out, "\n    2  0    0    0    0      0.00   0.00\n") &&
+                contains(run.out, "CIEDE2000 over 46 patches: mean ")) << run.out;
+    EXPECT_EQ(files(dir.dir()), 4) << "only the form and the three charts";
+    // Seven inks map one to one; six put ink B on the library's channel 6.
+    const std::tuple<int, std::vector<int>, const char*, const char*> multiChannelCases[] = {
+        {7, {0, 1, 2, 3, 4, 5, 6}, "multichannel.p5.chart", "multichannel.p5-p6.chart"},
+        {6, {0, 1, 2, 3, 4, 6}, "multichannel.p3.chart", "multichannel.p3-p6.chart"}};
+    for (const auto& [inks, channels, chart, separated] : multiChannelCases) {
+        std::vector<bool> exact;
+        std::ofstream(dir.path("form.txt")) << multiChannelForm(inks);
+        std::ofstream(dir.path("sep.txt")) << separations(channels, exact);
+        expectSuccess(runTool({"multichannel", "form.txt", "--inks", std::to_string(inks), "-o", "chart.txt",
+                               "--combinations", "comb.txt", "--separations", "sep.txt", "--separated-out", "xyz.txt"},
+                              dir.dir()),
+                      dir.path("chart.txt"), chart);
+        const auto combinations = readMeasurementText(ts::readFile(dir.path("comb.txt")));
+        ASSERT_TRUE(combinations.ok() && combinations.file->sets.size() == 3499u) << combinations.error.describe();
+        EXPECT_EQ(combinations.file->sets[1].device, (std::vector<double>{0, 0, 0, 2}));
+        // The separated chart: header, every record that went in unchanged, end.
+        const auto ours = ts::lines(ts::readFile(dir.path("xyz.txt"))),
+                   theirs = ts::lines(ts::readFile(ts::goldenPath(separated)));
+        ASSERT_TRUE(ours.size() == theirs.size() && std::count(exact.begin(), exact.end(), true) > 1000);
+        for (size_t line = 0; line < ours.size(); ++line)
+            EXPECT_TRUE((line >= 7 && line < 7 + exact.size() && !exact[line - 7]) || ours[line] == theirs[line])
+                << separated << " line " << line + 1 << ": " << ours[line];
+    }
+    std::ofstream(dir.path("chart.txt")) << conversionChart(0, 32);
+    std::ofstream(dir.path("without-target.txt")) << conversionChart(0, 31);
+    std::ofstream(dir.path("target.txt")) << conversionChart(31, 32);
+    // A white named inside the chart is a reference, not a chart patch.
+    const std::tuple<const char*, const char*, const char*, const char*, const char*> convertCases[] = {
+        {"without-target.txt", "PAPER_PRINTED", "target.txt", "copy", "conversion.p7.chart"},
+        {"chart.txt", "31", "PAPER_TARGET", "convert", "conversion.p8.chart"},
+        {"chart.txt", "PAPER_PRINTED", "PAPER_TARGET", "blend", "conversion.p9.chart"}};
+    for (const auto& [chart, from, to, mode, golden] : convertCases)
+        expectSuccess(runTool({"convert", chart, "--from", from, "--to", to, "--mode", mode, "-o", "out.txt"}, dir.dir()),
+                      dir.path("out.txt"), golden);
+}
+
+TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
+{
+    ts::TempDir dir;
+    Form missing = goldenForm("offset-form.in"), duplicate = missing, layout = missing;
+    missing.rows.erase(missing.rows.begin() + 17);
+    duplicate.rows[40][0] = "5"; // sample 5 twice, with two different patches
+    layout.fields[10] = "SPECTRAL_NM435";
+    const std::pair<const char*, std::string> inputs[] = {
+        {"short.txt", missing.text()}, {"twice.txt", duplicate.text()}, {"layout.txt", layout.text()},
+        {"junk.txt", "Report of 12 March\nall good\n"}, {"form7.txt", multiChannelForm(7)}, {"keep.txt", "old chart\n"}};
+    for (const auto& [name, text] : inputs)
+        std::ofstream(dir.path(name)) << text;
+    const std::tuple<Row, int, const char*> cases[] = {
+        {{"chart", "layout.txt"}, 2, "--output is required"},
+        {{"chart", "nothere.txt", "-o", "out.txt"}, 3, "nothere.txt: cannot open: No such file or directory"},
+        {{"chart", "junk.txt", "-o", "out.txt"}, 4, "junk.txt: no BEGIN_DATA_FORMAT line"},
+        {{"chart", "layout.txt", "-o", "out.txt"}, 5, "layout.txt: unknown spectral layout: bands 420 and 435 nm"},
+        {{"chart", "short.txt", "-o", "keep.txt"}, 6, "short.txt: test-form patch 18 (C 0 M 90 Y 0 K 0) is missing"},
+        {{"chart", "twice.txt", "-o", "out.txt"}, 7, "twice.txt:48: duplicate patch: sample 5 is also on line 12"},
+        // The chart's temporary file exists when the second output fails.
+        {{"multichannel", "form7.txt", "--inks", "7", "-o", "keep.txt", "--combinations", "no-folder/c.txt"}, 8,
+         "no-folder/c.txt: cannot create a file in no-folder/"},
+    };
+    for (const auto& [arguments, exitCode, message] : cases) {
+        const ToolRun run = runTool(arguments, dir.dir());
+        EXPECT_TRUE(run.exitCode == exitCode && run.err.rfind("veltmarquist: error: ", 0) == 0 &&
+                    contains(run.err, message) && std::count(run.err.begin(), run.err.end(), '\n') == 1)
+            << run.exitCode << " " << run.err;
+        EXPECT_EQ(files(dir.dir()), 6) << message << ": a file was left behind";
+    }
+    EXPECT_EQ(ts::readFile(dir.path("keep.txt")), "old chart\n");
+    const ToolRun help = runTool({"chart", "--help"}, dir.dir()); // documents the exit codes
+    EXPECT_TRUE(help.exitCode == 0 && contains(help.out, "6  a patch the calculation needs is missing")) << help.out;
+}
+
+TEST(CommandLine, RealMeasuredDataSet)
+{
+    const std::string path = VELTMARQUIST_SHARED_DATA_DIR "/APTEC_PC10_CardBoard_2023_v1_Spectral.txt";
+    if (!ts::fileExists(path))
+        GTEST_SKIP() << "the evaluation data set is not beside the project";
+    ts::TempDir dir;
+    const ToolRun run = runTool({"chart", path, "-o", "chart.txt"}, dir.dir());
+    expectSuccess(run);
+    // The file's quirks read, the patches found among repeats, the model checked on 720 measured combinations.
+    EXPECT_TRUE(contains(run.out, "1617 measurements, 36 bands 380-730 nm in 10 nm steps, reflectance 0-1 (detected)\n"
+                                  "  46 test-form patches found in 68 measurements (repeated measurements averaged "
+                                  "for 22 of them)") &&
+                contains(run.out, "check: 720 chart combinations measured beyond the test form, CIEDE2000 mean 1."))
+        << run.out;
+}
