@@ -274,7 +274,7 @@ TEST(CommandLine, EveryCommandEqualsTheLibrarysCharts)
     ts::TempDir dir;
     std::ofstream(dir.path("form.txt")) << goldenForm("offset-form.in").text();
     const std::tuple<Row, const char*, const char*> cases[] = {
-        {{"chart", "form.txt", "-o", "c.txt"}, "offset-form.p0.chart", "gray difference factor  C -0.04  M -0.03  Y -0.02"},
+        {{"chart", "form.txt", "-o", "c.txt"}, "offset-form.p0.chart", "gray difference factor  C -0.04  M -0.03  Y -0.02  K 0.03"},
         {{"chart", "form.txt", "-o", "c.txt", "--fit-gravure"}, "offset-form.rgb-p1.chart", "red 0.95  green 0.95  blue 1"},
         {{"chart", "form.txt", "-o", "c.txt", "--process", "gravure"}, "offset-form.p1.chart", "(defaults; --fit-gravure"},
         // Percent reflectance; the chart combinations measured beyond the test form check the model.
