@@ -111,6 +111,20 @@ using Primaries = double[kBands][16];
 
 const double (*const kXYZWeights)[3] = MathProfile::Gewichtsfaktoren_XYZ_D50;
 
+// One band of one lane: the Neugebauer sum in primary order, its absolute
+// value, and its share of X, Y and Z added in band order, as spec2XYZ adds.
+template <typename Sums>
+inline void addBand(const double (&w)[16], const double* S, int j, int l, Sums& sums)
+{
+    double R = 0.0;
+    for (int p = 0; p < 16; ++p)
+        R += w[p] * S[p];
+    const double s = std::fabs(R);
+    sums.X[l] += s * kXYZWeights[j][0];
+    sums.Y[l] += s * kXYZWeights[j][1];
+    sums.Z[l] += s * kXYZWeights[j][2];
+}
+
 // Three-colour grey, one yellow factor per lane. The weights are written as
 // calcOffsetSample writes them.
 GRAYFIT_LANE_LOOP
@@ -128,13 +142,7 @@ void yellowLaneSums(const Primaries& primaries, const InkRow& cyan, const InkRow
                                   aM * aY * nC * nK, aC * aY * nM * nK, aC * aM * nY * nK, aC * aK * nM * nY,
                                   aM * aK * nC * nY, aY * aK * nC * nM, aM * aY * aK * nC, aC * aY * aK * nM,
                                   aC * aM * aK * nY, aC * aM * aY * nK, aC * aM * aY * aK, nC * nM * nY * nK};
-            double R = 0.0;
-            for (int p = 0; p < 16; ++p)
-                R += w[p] * S[p];
-            const double s = std::fabs(R);
-            sums.X[l] += s * kXYZWeights[j][0];
-            sums.Y[l] += s * kXYZWeights[j][1];
-            sums.Z[l] += s * kXYZWeights[j][2];
+            addBand(w, S, j, l, sums);
         }
     }
     out = sums;
@@ -171,13 +179,7 @@ void blackLaneSums(const Primaries& primaries, const BandTerms* terms, const Ink
                 t.aC_aM_aY * aK,         // aC * aM * aY * aK
                 t.nC_nM_nY * nK,         // nC * nM * nY * nK
             };
-            double R = 0.0;
-            for (int p = 0; p < 16; ++p)
-                R += w[p] * S[p];
-            const double s = std::fabs(R);
-            sums.X[l] += s * kXYZWeights[j][0];
-            sums.Y[l] += s * kXYZWeights[j][1];
-            sums.Z[l] += s * kXYZWeights[j][2];
+            addBand(w, S, j, l, sums);
         }
     }
     out = sums;
