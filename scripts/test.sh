@@ -1,16 +1,18 @@
 #!/usr/bin/env bash
 # Builds everything and runs every test: the unit and tool tests, the same
-# suite under AddressSanitizer + UndefinedBehaviorSanitizer, and the
-# reliability stages (fuzzing, memcheck) when present.
+# suite under AddressSanitizer + UndefinedBehaviorSanitizer, then each stage
+# below. A stage that is missing fails the run by name.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
+stages=(20-install-examples 30-fuzz 40-tsan 50-valgrind)
+
 scripts/setup.sh
 cmake --workflow --preset dev
+scripts/skipped-tests.sh build/dev
 cmake --workflow --preset asan-ubsan
-for stage in scripts/stages/*.sh; do
-  [ -e "$stage" ] || continue
-  echo "== ${stage##*/}"
-  bash "$stage"
+for stage in "${stages[@]}"; do
+  echo "== $stage"
+  bash "scripts/stages/$stage.sh"
 done
 echo "all test stages passed"

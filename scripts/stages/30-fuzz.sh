@@ -20,9 +20,7 @@ cmake -S . -B "$build" -G Ninja -DCMAKE_BUILD_TYPE=RelWithDebInfo \
   -DCMAKE_C_COMPILER=clang -DCMAKE_CXX_COMPILER=clang++ \
   -DCMAKE_C_FLAGS="$flags" -DCMAKE_CXX_FLAGS="$flags" \
   -DVELTMARQUIST_BUILD_TOOLS=OFF -DVELTMARQUIST_BUILD_BENCH=OFF >/dev/null
-targets=(fuzz_calculate_chart)
-[ -e tools/veltmarquist/MeasurementFile.cpp ] && targets+=(fuzz_measurement_file)
-cmake --build "$build" -j2 --target "${targets[@]}"
+cmake --build "$build" -j2 --target fuzz_calculate_chart fuzz_measurement_file
 
 export ASAN_OPTIONS=detect_leaks=1:abort_on_error=1
 export UBSAN_OPTIONS=print_stacktrace=1:halt_on_error=1
@@ -47,16 +45,11 @@ fuzz() {
 }
 
 fuzz calculate-chart fuzz/corpus/calculate-chart & chart=$!
-reader=""
-if [ -e "$build/fuzz/fuzz_measurement_file" ]; then
-  fuzz measurement-file fuzz/corpus/measurement-file tests/golden samples & reader=$!
-else
-  echo "fuzz: no measurement-file reader in tools/veltmarquist yet, only CalculateChart is fuzzed"
-fi
+fuzz measurement-file fuzz/corpus/measurement-file tests/golden samples & reader=$!
 
 failed=0
 wait "$chart" || failed=1
-[ -z "$reader" ] || wait "$reader" || failed=1
+wait "$reader" || failed=1
 for log in "$build"/*.log; do
   echo "-- ${log##*/}"
   grep -E '^(stat::|INFO: Seed|Done|==[0-9]+==ERROR|SUMMARY|broken promise|artifact_prefix|Test unit written)' "$log" || true

@@ -369,7 +369,7 @@ TEST(CommandLine, RealMeasuredDataSet)
 {
     const std::string path = VELTMARQUIST_SHARED_DATA_DIR "/APTEC_PC10_CardBoard_2023_v1_Spectral.txt";
     if (!ts::fileExists(path))
-        GTEST_SKIP() << "the evaluation data set is not beside the project";
+        GTEST_SKIP() << "no evaluation data set at " << path << " (the real press data set is not beside the project)";
     ts::TempDir dir;
     const ToolRun run = runTool({"chart", path, "-o", "chart.txt"}, dir.dir());
     expectSuccess(run);

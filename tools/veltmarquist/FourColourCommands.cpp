@@ -3,6 +3,7 @@
 #include "Commands.h"
 
 #include "Files.h"
+#include "OutputFile.h"
 #include "LibraryHost.h"
 #include "PatchMatching.h"
 #include "ToolError.h"

@@ -5,6 +5,7 @@
 #define VELTMARQUIST_TOOL_LIBRARYHOST_H
 
 #include "Files.h"
+#include "OutputFile.h"
 #include "PatchMatching.h"
 
 #include "MathProfile.h"

@@ -4,6 +4,7 @@
 #include "Commands.h"
 
 #include "Files.h"
+#include "OutputFile.h"
 #include "LibraryHost.h"
 #include "PatchMatching.h"
 #include "ToolError.h"
