@@ -13,6 +13,7 @@
 // Between 0.008856 and 1 the cube root is read from a 1025-entry single
 // precision table with linear interpolation; charts that hosts already hold
 // were computed that way, so the table and its float steps are kept exactly.
+#include "Colorimetry.h"
 #include "MathProfile.h"
 
 #include <charconv>
@@ -88,18 +89,31 @@ static std::array<float, 1025> buildCubeRootSamples()
 
 const std::array<float, 1025> MathProfile::cuberoot_samples = buildCubeRootSamples();
 
-void MathProfile::spec2XYZ(ColorPatch* patch)
+namespace colorimetry {
+
+double defaultNormFactor()
+{
+    // Summed from 380 nm upward: 99.94200000000001, so the factor is
+    // 1.0005803365952251 and a perfect white gets Y = 100 up to rounding.
+    double sum = 0.0;
+    for (const auto& weights : MathProfile::Gewichtsfaktoren_XYZ_D50)
+        sum += weights[1];
+    return 100.0 / sum;
+}
+
+void spectrumToXYZ(const double* spectrum, double normFactor, double* XYZ)
 {
     for (int column = 0; column < 3; ++column) {
         double sum = 0.0;
-        for (int band = 0; band < kBands; ++band)
-            sum += patch->spectrum[band] * Gewichtsfaktoren_XYZ_D50[band][column];
-        patch->XYZ[column] = sum * normFactor;
+        for (int band = 0; band < MathProfile::kBands; ++band)
+            sum += spectrum[band] * MathProfile::Gewichtsfaktoren_XYZ_D50[band][column];
+        XYZ[column] = sum * normFactor;
     }
 }
 
-double MathProfile::icc_f(double t)
+double iccF(double t)
 {
+    const std::array<float, 1025>& samples = MathProfile::cuberoot_samples;
     // The negated test also sends NaN to the linear branch.
     if (!(t > 0.008856))
         return 7.787 * t + 16.0 / 116.0;
@@ -109,20 +123,37 @@ double MathProfile::icc_f(double t)
     const float v = static_cast<float>(t * 1024.0);
     const int i = static_cast<int>(v);
     if (i >= 1024)
-        return cuberoot_samples[1024]; // t rounds to 1: f is 0, the upper sample is not needed
+        return samples[1024]; // t rounds to 1: f is 0, the upper sample is not needed
     const float f = v - static_cast<float>(i);
-    const float upper = f * cuberoot_samples[static_cast<size_t>(i) + 1]; // single-precision product
-    return (1.0 - f) * cuberoot_samples[static_cast<size_t>(i)] + upper;
+    const float upper = f * samples[static_cast<size_t>(i) + 1]; // single-precision product
+    return (1.0 - f) * samples[static_cast<size_t>(i)] + upper;
+}
+
+void XYZToLab(double X, double Y, double Z, double* Lab)
+{
+    const double fy = iccF(Y);
+    Lab[0] = 116.0 * fy - 16.0;
+    Lab[1] = 500.0 * (iccF(X / kIccD50WhiteX) - fy);
+    Lab[2] = 200.0 * (fy - iccF(Z / kIccD50WhiteZ));
+}
+
+} // namespace colorimetry
+
+void MathProfile::spec2XYZ(ColorPatch* patch)
+{
+    colorimetry::spectrumToXYZ(patch->spectrum, normFactor, patch->XYZ);
+}
+
+double MathProfile::icc_f(double t)
+{
+    return colorimetry::iccF(t);
 }
 
 MathProfile::lab MathProfile::XYZ2LAB(xyz value)
 {
-    const double fy = icc_f(value.Y);
-    lab result;
-    result.L = 116.0 * fy - 16.0;
-    result.a = 500.0 * (icc_f(value.X / kIccD50WhiteX) - fy);
-    result.b = 200.0 * (fy - icc_f(value.Z / kIccD50WhiteZ));
-    return result;
+    double L[3];
+    colorimetry::XYZToLab(value.X, value.Y, value.Z, L);
+    return lab{L[0], L[1], L[2]};
 }
 
 MathProfile::lab MathProfile::labOf(const ColorPatch& patch)

@@ -4,6 +4,7 @@
 // 36-band row per patch, 380 to 730 nm, runs the calculation that the process
 // selects, and turns every exception into a status: no exception crosses the
 // C boundary.
+#include "Colorimetry.h"
 #include "MathProfile.h"
 #include "ScratchAllocation.h"
 #include "VeltmarquistDLL.h"
@@ -22,12 +23,7 @@ MathProfile::MathProfile(const char* name)
     rgbFactor[0] = 0.9;
     rgbFactor[1] = 0.85;
     rgbFactor[2] = 0.85;
-    // Summed from 380 nm upward: 99.94200000000001, so normFactor is
-    // 1.0005803365952251 and a perfect white gets Y = 100 up to rounding.
-    double sum = 0.0;
-    for (const auto& weights : Gewichtsfaktoren_XYZ_D50)
-        sum += weights[1];
-    normFactor = 100.0 / sum;
+    normFactor = colorimetry::defaultNormFactor();
     for (double& factor : grayDiffFactor)
         factor = 0.0;
     coverageLimit = 200.0;
