@@ -25,7 +25,7 @@ struct YuleNielsenFit {
 
     // Quality of the fit.
     double tintResidualRms = 0.0;      // RMS reflectance residual over the 28 tints' bands
-    std::array<double, 2> greyDeltaE{}; // CIEDE2000 of the three- and four-colour grey after the fit
+    std::array<double, 2> greyDeltaE{}; // CIE 1976 dE*ab of the three- and four-colour grey after the fit
     std::vector<std::string> warnings; // for example a factor at its bound or a large grey residual
 };
 
