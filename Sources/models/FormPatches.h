@@ -31,6 +31,11 @@ struct FormPatches {
     const Bands& solid(int ink) const { return primary[1u << ink]; }
 };
 
+// The patches of a form given as 46 rows of 36 bands in measuring order (the
+// order of MathProfile::dithering), each placed by its coverages. The rows are
+// taken as they are: no orientation check.
+FormPatches formPatchesFromRows(const double* const* rows);
+
 } // namespace models
 } // namespace veltmarquist
 
