@@ -56,11 +56,12 @@ double monotoneCurveAt(const double* x, const double* y, const double* slope, in
     const double h = x[k + 1] - x[k];
     const double t = (at - x[k]) / h;
     const double t2 = t * t, t3 = t2 * t;
-    const double h00 = 2.0 * t3 - 3.0 * t2 + 1.0;
-    const double h10 = t3 - 2.0 * t2 + t;
+    // y_k + (y_k+1 - y_k) h01 + h (h10 m_k + h11 m_k+1), the Hermite basis
+    // with h00 = 1 - h01 folded in: a flat interval stays exactly flat.
     const double h01 = -2.0 * t3 + 3.0 * t2;
+    const double h10 = t3 - 2.0 * t2 + t;
     const double h11 = t3 - t2;
-    return h00 * y[k] + h10 * h * slope[k] + h01 * y[k + 1] + h11 * h * slope[k + 1];
+    return y[k] + (y[k + 1] - y[k]) * h01 + h * (h10 * slope[k] + h11 * slope[k + 1]);
 }
 
 } // namespace models
