@@ -10,7 +10,10 @@
 // 100 % has a(1 - a) = 0 and is not spread, so paper, solids and overprints
 // come back as measured (they are copied, not raised to 1/n and back).
 // d a'_i / d a_i = 1 + s_i q_i (1 - 2 a_i) > 0 while |s_i| < 1, so a
-// monotone curve stays monotone.
+// monotone curve stays monotone. A negative s_i lets a second ink shrink
+// ink i's area, so a strongly negative factor can lighten a band a little as
+// another ink grows; with factors of the size presses show (|s| <= 0.1) and
+// primaries that darken with every ink, every band darkens as any ink grows.
 //
 // The fit reads only the form, in three stages:
 //   1. n(l) and the 28 tint areas together, bounded least squares on the
