@@ -354,7 +354,6 @@ TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
          "no-folder/c.txt: cannot create a file in no-folder/"},
         {{"chrat", "form7.txt"}, 2, "unknown command 'chrat'; commands: chart, compare, multichannel, convert"},
         {{"chart", "keep.txt", "-o", "./keep.txt"}, 2, "./keep.txt: is the same file as the input keep.txt"},
-        {{"multichannel", "form7.txt", "--inks", "7", "-o", "-", "--combinations", "-"}, 2, "two outputs go to standard"},
         // Control characters from a path or a file are shown escaped.
         {{"chart", "in\x1b[2J\t.txt", "-o", "out.txt"}, 3, "in\\x1b[2J\\t.txt: cannot open"},
     };
