@@ -352,6 +352,10 @@ TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
         // The chart's temporary file exists when the second output fails.
         {{"multichannel", "form7.txt", "--inks", "7", "-o", "keep.txt", "--combinations", "no-folder/c.txt"}, 8,
          "no-folder/c.txt: cannot create a file in no-folder/"},
+        {{"chrat", "form7.txt"}, 2, "unknown command 'chrat'; commands: chart, compare, multichannel, convert"},
+        {{"chart", "keep.txt", "-o", "./keep.txt"}, 2, "./keep.txt: is the same file as the input keep.txt"},
+        // Control characters from a path or a file are shown escaped.
+        {{"chart", "in\x1b[2J\t.txt", "-o", "out.txt"}, 3, "in\\x1b[2J\\t.txt: cannot open"},
     };
     for (const auto& [arguments, exitCode, message] : cases) {
         const ToolRun run = runTool(arguments, dir.dir());

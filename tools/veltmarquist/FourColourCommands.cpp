@@ -10,6 +10,7 @@
 
 #include <cstdio>
 #include <set>
+#include <sstream>
 
 namespace veltmarquist {
 
@@ -121,6 +122,7 @@ void checkAgainstMeasurements(const TestForm& form, const std::string& chartPath
 
 void runChart(const ChartOptions& options, std::ostream& out)
 {
+    refuseClashingOutputs({options.form}, {options.output});
     TestForm form = readTestForm(options.form, options.read, out);
     PendingOutput output(options.output);
     Profile profile(fileStem(options.form));
@@ -133,20 +135,27 @@ void runChart(const ChartOptions& options, std::ostream& out)
         printGravureModel(profile.object(), options.fitGravure, out);
     else
         printOffsetModel(profile.object(), out);
+    // The check reads the chart before it is delivered: standard output
+    // cannot be read back.
+    std::ostringstream check;
+    checkAgainstMeasurements(form, output.temporaryPath(), check);
     output.commit();
-    out << "chart: 900 patches (" << processName(options.process) << " model) written to " << output.path() << "\n";
-    checkAgainstMeasurements(form, output.path(), out);
+    out << "chart: 900 patches (" << processName(options.process) << " model) written to " << output.name() << "\n"
+        << check.str();
 }
 
 void runCompare(const CompareOptions& options, std::ostream& out)
 {
-    TestForm form = readTestForm(options.form, options.read, out);
     std::string folder = options.outputFolder.empty() ? "." : options.outputFolder;
     if (folder.back() != '/')
         folder += '/';
     const std::string stem = folder + fileStem(options.form);
-    PendingOutput measuredChart(stem + ".measured46.txt");
-    PendingOutput modelChart(stem + "." + processName(options.process) + "46.txt");
+    const std::string measuredPath = stem + ".measured46.txt",
+                      modelPath = stem + "." + processName(options.process) + "46.txt";
+    refuseClashingOutputs({options.form}, {measuredPath, modelPath});
+    TestForm form = readTestForm(options.form, options.read, out);
+    PendingOutput measuredChart(measuredPath);
+    PendingOutput modelChart(modelPath);
 
     Profile profile(fileStem(options.form));
     RowTable rows(form.block);
@@ -164,22 +173,19 @@ void runCompare(const CompareOptions& options, std::ostream& out)
         object.clearTintLists();
         object.calculateChart46(rows.rows(), options.process, measuredChart.temporaryPath().c_str(), true);
     });
-    measuredChart.expectCompleteChart();
-    modelChart.expectCompleteChart();
+    // Both charts are checked before either is delivered: both or neither.
+    measuredChart.checkChart();
+    modelChart.checkChart();
     if (options.process == VM_PROCESS_GRAVURE)
         printGravureModel(profile.object(), options.fitGravure, out);
     else
         printOffsetModel(profile.object(), out);
-    measuredChart.commit();
-    modelChart.commit();
-    out << "measured 46-step chart written to " << measuredChart.path() << "\n"
-        << "modelled 46-step chart (" << processName(options.process) << ") written to " << modelChart.path()
-        << "\n";
 
-    const MeasurementFile measured = readChart(measuredChart.path());
-    const MeasurementFile modelled = readChart(modelChart.path());
+    const MeasurementFile measured = readChart(measuredChart.temporaryPath());
+    const MeasurementFile modelled = readChart(modelChart.temporaryPath());
+    std::ostringstream table;
     std::vector<double> ab, de2000;
-    out << "patch  C    M    Y    K     dE*ab   dE00\n";
+    table << "patch  C    M    Y    K     dE*ab   dE00\n";
     for (size_t i = 0; i < measured.sets.size() && i < modelled.sets.size(); ++i) {
         const Lab truth = labOfXYZ(measured.sets[i].XYZ), model = labOfXYZ(modelled.sets[i].XYZ);
         ab.push_back(deltaEab(truth, model));
@@ -188,10 +194,16 @@ void runCompare(const CompareOptions& options, std::ostream& out)
         const std::vector<double>& device = measured.sets[i].device;
         std::snprintf(line, sizeof line, "%5zu  %-4g %-4g %-4g %-4g %6.2f %6.2f\n", i + 1, device[0], device[1],
                       device[2], device[3], ab.back(), de2000.back());
-        out << line;
+        table << line;
     }
-    printSummary("dE*ab    over " + std::to_string(ab.size()) + " patches:", summarise(ab), out);
-    printSummary("CIEDE2000 over " + std::to_string(de2000.size()) + " patches:", summarise(de2000), out);
+    printSummary("dE*ab    over " + std::to_string(ab.size()) + " patches:", summarise(ab), table);
+    printSummary("CIEDE2000 over " + std::to_string(de2000.size()) + " patches:", summarise(de2000), table);
+
+    measuredChart.commit();
+    modelChart.commit();
+    out << "measured 46-step chart written to " << measuredChart.name() << "\n"
+        << "modelled 46-step chart (" << processName(options.process) << ") written to " << modelChart.name() << "\n"
+        << table.str();
 }
 
 } // namespace veltmarquist

@@ -41,10 +41,10 @@ void Profile::calculate(PrintProcess process, const PendingOutput& output, Measu
         handle_ = nullptr; // the library has destroyed the profile
     switch (status) {
     case VM_STATUS_OK:
-        output.expectCompleteChart();
+        output.checkChart();
         return;
     case VM_STATUS_FILE_NOT_OPENED:
-        throw ToolError(Failure::OutputUnwritable, output.path() + ": the library could not open the chart file");
+        throw ToolError(Failure::OutputUnwritable, output.name() + ": the library could not open the chart file");
     case VM_STATUS_OUT_OF_MEMORY:
         throw ToolError(Failure::Calculation, "the library ran out of memory (status 5)");
     case VM_STATUS_CALCULATION_FAILED:

@@ -32,7 +32,7 @@ public:
     MathProfile& object();
 
     // CalculateChart into the output's temporary file; a status other than
-    // 0 becomes a ToolError, and the chart is checked for completeness.
+    // 0 becomes a ToolError, and the chart is checked (complete, finite).
     void calculate(PrintProcess process, const PendingOutput& output, MeasurementBlock& block);
 
     // Runs a class method; the library's exceptions become ToolErrors.

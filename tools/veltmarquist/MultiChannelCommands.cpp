@@ -153,6 +153,8 @@ void resolveWhite(const std::string& given, const char* option, const Measuremen
 
 void runMultiChannel(const MultiChannelOptions& options, std::ostream& out)
 {
+    refuseClashingOutputs({options.form, options.separations},
+                          {options.output, options.combinations, options.separatedOutput});
     const MeasurementFile form = loadMeasurementFile(options.form, options.read);
     const std::string family = std::to_string(options.inks) + "CLR_";
     if (form.deviceFields.size() != static_cast<size_t>(options.inks))
@@ -206,21 +208,22 @@ void runMultiChannel(const MultiChannelOptions& options, std::ostream& out)
 
     chart.commit();
     out << (options.inks == 6 ? "six-colour chart: 128" : "seven-colour chart: 159")
-        << " spectral patches written to " << chart.path() << "\n";
+        << " spectral patches written to " << chart.name() << "\n";
     if (combinations) {
         combinations->commit();
         out << "combinations: 3499 C, M, Y, K combinations for the separation software written to "
-            << combinations->path() << "\n";
+            << combinations->name() << "\n";
     }
     if (separated) {
         separated->commit();
         out << "separated set: 3499 patches (XYZ) predicted from " << options.separations << " written to "
-            << separated->path() << "\n";
+            << separated->name() << "\n";
     }
 }
 
 void runConvert(const ConvertOptions& options, std::ostream& out)
 {
+    refuseClashingOutputs({options.chart, options.from, options.to}, {options.output});
     const MeasurementFile chart = loadMeasurementFile(options.chart, options.read);
     if (!chart.layout.present() || chart.deviceFields.empty())
         throw ToolError(Failure::InputContent, options.chart + ": a chart needs device fields (CMYK_C ... or "
@@ -274,7 +277,7 @@ void runConvert(const ConvertOptions& options, std::ostream& out)
     output.commit();
 
     if (copy) {
-        out << "chart: " << patches.size() << " patches copied to " << output.path() << "\n";
+        out << "chart: " << patches.size() << " patches copied to " << output.name() << "\n";
         return;
     }
     out << "whites: " << from.label << " -> " << to.label << ", " << fixed(whitesApart) << " dE*ab apart\n";
@@ -284,7 +287,7 @@ void runConvert(const ConvertOptions& options, std::ostream& out)
             << "\n";
     }
     out << "chart: " << patches.size() << " patches " << (options.mode == VM_PROCESS_CHART_BLEND ? "blended" : "converted")
-        << ", written to " << output.path() << "\n";
+        << ", written to " << output.name() << "\n";
 }
 
 } // namespace veltmarquist

@@ -1,38 +1,79 @@
-// Outputs of the tool: no half-written file ever stands under the final name.
+// Outputs of the tool: no half-written or non-finite file ever stands under
+// the final name, and an output path behaves as users of Unix tools expect.
 #ifndef VELTMARQUIST_TOOL_OUTPUTFILE_H
 #define VELTMARQUIST_TOOL_OUTPUTFILE_H
 
+#include <cstddef>
 #include <string>
+#include <vector>
 
 namespace veltmarquist {
 
-// An output that appears only when complete. The constructor creates a
-// temporary file in the target's folder (so that the final rename stays on
-// one file system); writers fill the temporary file, and commit() renames it
-// over the target. Without commit the temporary file is removed.
+// "-" names standard output.
+bool isStandardOutput(const std::string& path);
+
+// Refuses (Failure::Usage) an output that is the same file as one of the
+// inputs (device and inode, through symbolic links), and two outputs of one
+// run on the same file or both on standard output. Character devices such as
+// /dev/null may take several outputs. Call it before anything is written.
+void refuseClashingOutputs(const std::vector<std::string>& inputs, const std::vector<std::string>& outputs);
+
+// An output that appears only when complete and checked. The constructor
+// creates a temporary file; writers (the library, or write()) fill it, the
+// checks read it, and commit() delivers it:
+// - a new or existing regular file: the temporary file lies beside the
+//   target (same file system) and is renamed over it. An existing file keeps
+//   its mode, and its owner and group where the system permits; other hard
+//   links to it keep the old contents. A file we may not write is refused,
+//   as cp refuses it without -f.
+// - a symbolic link: written through to the file it names (a dangling link
+//   creates that file), the link itself stays.
+// - standard output ("-"), a FIFO or a device: the temporary file lies in
+//   $TMPDIR (or /tmp) and is copied into the target, which is never replaced.
+// Without commit, or when the process is interrupted (SIGINT, SIGTERM,
+// SIGHUP), the temporary file is removed and the target stays untouched.
 class PendingOutput {
 public:
-    explicit PendingOutput(std::string path); // OutputUnwritable when the folder cannot take it
+    explicit PendingOutput(std::string path); // OutputUnwritable when the target cannot take it
     ~PendingOutput();
     PendingOutput(const PendingOutput&) = delete;
     PendingOutput& operator=(const PendingOutput&) = delete;
 
+    // The path as given, and how messages name it ("standard output" for "-").
     const std::string& path() const { return path_; }
+    std::string name() const;
     const std::string& temporaryPath() const { return temporary_; }
 
-    // Writes `text` to the temporary file (for the tool's own files).
+    // Writes `text` to the temporary file (the tool's own files); refuses a
+    // text whose data holds a non-finite number.
     void write(const std::string& text);
-    // Checks that the temporary file is complete: a library chart ends with
-    // "END_DATA" and a newline. The library does not see write errors (a
-    // full disk, say), so this is where they surface.
-    void expectCompleteChart() const;
+    // Checks the library's chart in the temporary file: it ends with
+    // "END_DATA" and a newline (the library does not see write errors such
+    // as a full disk, so they surface here), and every value of its data is
+    // finite (Failure::Calculation naming the first patch that is not).
+    void checkChart() const;
     void commit();
 
 private:
+    void deliverByCopy();
+
     std::string path_;
+    std::string target_; // symbolic links resolved
     std::string temporary_;
+    bool copy_ = false;  // standard output, FIFO or device
+    int slot_ = -1;      // the temporary file's place in the interruption registry
     bool committed_ = false;
 };
+
+// Throws Failure::Calculation when the data of a chart or CGATS text (the
+// lines between BEGIN_DATA and END_DATA) holds a value that is not finite
+// (nan, inf, in any case and sign). The message names `what`, the first such
+// patch by number and device values, and the field.
+void refuseNonFiniteData(const std::string& text, const std::string& what);
+
+// Writes all `size` bytes to a descriptor, resuming after interruptions and
+// short writes. Returns 0, or the error number of the failed write.
+int writeFully(int descriptor, const char* data, size_t size);
 
 } // namespace veltmarquist
 

@@ -3,13 +3,20 @@
 // Parses the command line, runs one command, and maps every failure to one
 // line on stderr and a documented exit code.
 #include "Commands.h"
+#include "Messages.h"
+#include "OutputFile.h"
 #include "ToolError.h"
 
 #include "VeltmarquistDLL.h"
 
 #include <CLI/CLI.hpp>
 
+#include <unistd.h>
+
+#include <cerrno>
+#include <csignal>
 #include <cstdio>
+#include <cstring>
 #include <iostream>
 #include <new>
 
@@ -22,17 +29,18 @@ namespace {
 using namespace veltmarquist;
 
 const char* const kExitCodes =
+    "An output given as - goes to standard output; the report then goes to stderr.\n\n"
     "Exit codes:\n"
     "  0  success\n"
     "  1  internal error\n"
-    "  2  bad command line\n"
+    "  2  bad command line; outputs that clash with an input or with each other\n"
     "  3  an input file cannot be opened or read\n"
     "  4  an input file is not readable CGATS / IT8 text\n"
     "  5  unsupported content: unknown spectral layout, missing fields, bad values\n"
     "  6  a patch the calculation needs is missing\n"
     "  7  duplicate patch: one sample identifier names two different patches\n"
-    "  8  an output file cannot be written\n"
-    "  9  the library rejected or failed the calculation\n";
+    "  8  an output cannot be written (including standard output)\n"
+    "  9  the library rejected or failed the calculation, or its result is not finite\n";
 
 std::string versionText()
 {
@@ -72,11 +80,39 @@ PrintProcess chosenProcess(const CLI::App& command, const std::string& name, boo
     return fitGravure ? VM_PROCESS_GRAVURE : fourColourProcess(name);
 }
 
-int fail(const ToolError& error)
+int fail(const ToolError& error, std::ostream& report)
 {
-    std::cout.flush();
-    std::cerr << "veltmarquist: error: " << error.what() << "\n";
+    report.flush();
+    printMessage("error", error.what());
     return exitCodeOf(error.failure());
+}
+
+const char* const kCommandNames = "chart, compare, multichannel, convert";
+
+// What is wrong with the command itself (the first word that is not an
+// option must name a command), or else CLI11's message as one line.
+std::string usageMessage(const CLI::ParseError& error, int argc, char** argv)
+{
+    if (argc < 2)
+        return std::string("no command given; commands: ") + kCommandNames;
+    for (int at = 1; at < argc; ++at) {
+        const std::string word = argv[at];
+        if (word.empty() || word[0] == '-')
+            continue;
+        if ((std::string(", ") + kCommandNames + ",").find(", " + word + ",") == std::string::npos)
+            return "unknown command '" + word + "'; commands: " + kCommandNames;
+        break;
+    }
+    std::string message;
+    for (const char character : std::string(error.what())) {
+        if (character != '\n')
+            message += character;
+        else if (!message.empty() && message.back() != ' ')
+            message += "; ";
+    }
+    while (!message.empty() && (message.back() == ' ' || message.back() == ';'))
+        message.pop_back();
+    return message + " (see veltmarquist --help)";
 }
 
 } // namespace
@@ -147,42 +183,66 @@ int main(int argc, char** argv)
     convertCommand->add_option("-o,--output", convert.output, "spectral chart to write")->required();
     addScale(*convertCommand, scale);
 
+    // A closed pipe shows as EPIPE where the tool writes: the report stops
+    // quietly, a chart on standard output ends the run quietly.
+    std::signal(SIGPIPE, SIG_IGN);
     try {
         app.parse(argc, argv);
     } catch (const CLI::Success& done) {
-        return app.exit(done); // --help, --version
+        errno = 0;
+        const int code = app.exit(done); // --help, --version
+        std::cout.flush();
+        if (!std::cout && errno != EPIPE)
+            return fail(ToolError(Failure::OutputUnwritable, std::string("standard output: write failed: ") +
+                                                                 std::strerror(errno != 0 ? errno : EIO)),
+                        std::cerr);
+        return code;
     } catch (const CLI::ParseError& error) {
-        return fail(ToolError(Failure::Usage, std::string(error.what()) + " (see veltmarquist --help)"));
+        return fail(ToolError(Failure::Usage, usageMessage(error, argc, argv)), std::cerr);
     }
+
+    // With an output on standard output the report goes to stderr.
+    bool chartOnStandardOutput = false;
+    for (const std::string* output : {&chart.output, &multi.output, &multi.combinations, &multi.separatedOutput,
+                                      &convert.output})
+        chartOnStandardOutput = chartOnStandardOutput || isStandardOutput(*output);
+    const int reportDescriptor = chartOnStandardOutput ? STDERR_FILENO : STDOUT_FILENO;
+    ReportBuffer reportBuffer(reportDescriptor);
+    std::ostream report(&reportBuffer);
 
     try {
         const ReadOptions read = readOptions(scale);
         if (*chartCommand) {
             chart.process = chosenProcess(*chartCommand, processName, chart.fitGravure);
             chart.read = read;
-            runChart(chart, std::cout);
+            runChart(chart, report);
         } else if (*compareCommand) {
             compare.process = chosenProcess(*compareCommand, processName, compare.fitGravure);
             compare.read = read;
-            runCompare(compare, std::cout);
+            runCompare(compare, report);
         } else if (*multiCommand) {
             multi.read = read;
-            runMultiChannel(multi, std::cout);
+            runMultiChannel(multi, report);
         } else if (*convertCommand) {
             convert.mode = mode == "copy" ? VM_PROCESS_CHART_COPY
                                           : mode == "blend" ? VM_PROCESS_CHART_BLEND : VM_PROCESS_CHART_CONVERT;
             if (convert.mode != VM_PROCESS_CHART_COPY && (convert.from.empty() || convert.to.empty()))
                 throw ToolError(Failure::Usage, "--mode " + mode + " needs --from and --to");
             convert.read = read;
-            runConvert(convert, std::cout);
+            runConvert(convert, report);
         }
     } catch (const ToolError& error) {
-        return fail(error);
+        return fail(error, report);
     } catch (const std::bad_alloc&) {
-        return fail(ToolError(Failure::Internal, "out of memory"));
+        return fail(ToolError(Failure::Internal, "out of memory"), report);
     } catch (const std::exception& error) {
-        return fail(ToolError(Failure::Internal, error.what()));
+        return fail(ToolError(Failure::Internal, error.what()), report);
     }
-    std::cout.flush();
-    return std::cout ? 0 : exitCodeOf(Failure::OutputUnwritable);
+    report.flush();
+    if (reportBuffer.error() != 0 && reportDescriptor == STDOUT_FILENO)
+        return fail(ToolError(Failure::OutputUnwritable,
+                              std::string("standard output: cannot write the report: ") +
+                                  std::strerror(reportBuffer.error())),
+                    report);
+    return 0;
 }
