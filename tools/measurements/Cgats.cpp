@@ -378,8 +378,10 @@ std::string writtenValue(const std::string& value, bool alwaysQuote)
 {
     if (value.find_first_of("\"\r\n") != std::string::npos)
         throw std::invalid_argument("a CGATS value cannot hold a double quote or a line end: " + excerpt(value));
+    const bool structural = equalsIgnoringCase(value, "END_DATA") || equalsIgnoringCase(value, "END_DATA_FORMAT") ||
+                            equalsIgnoringCase(value, "BEGIN_DATA");
     const bool plain = !value.empty() && value.find_first_of(" \t") == std::string::npos && value[0] != '#' &&
-                       value[0] != '\'';
+                       value[0] != '\'' && value[0] != '"' && !structural;
     return plain && !alwaysQuote ? value : '"' + value + '"';
 }
 

@@ -96,6 +96,9 @@ int findField(const std::vector<std::string>& fields, const char* wanted)
     return -1;
 }
 
+// Sets reserved ahead at most (a few hundred MB); beyond, the vector grows.
+constexpr std::int64_t kMaxReserved = 4000000;
+
 // Builds the sets row by row as the CGATS reader hands them over; values are
 // kept in the file's own unit until the scale is known.
 class SetReader : public cgats::Handler {
@@ -154,13 +157,19 @@ std::optional<cgats::Error> SetReader::begin(const cgats::Header& header)
     file.hasXYZ = xyzColumns_[0] >= 0 && xyzColumns_[1] >= 0 && xyzColumns_[2] >= 0;
     // Every cell of a row takes two bytes at least.
     if (const cgats::Keyword* sets = header.find("NUMBER_OF_SETS"))
-        file.sets.reserve(static_cast<size_t>(
-            std::min<std::int64_t>(std::stoll(sets->value), bytes_ / static_cast<std::int64_t>(2 * file.fields.size()))));
+        file.sets.reserve(static_cast<size_t>(std::min<std::int64_t>(
+            {std::stoll(sets->value), bytes_ / static_cast<std::int64_t>(2 * file.fields.size()), kMaxReserved})));
     return std::nullopt;
 }
 
 std::optional<cgats::Error> SetReader::row(int line, const std::vector<std::string_view>& cells)
 {
+    if (file.sets.empty() && file.sets.capacity() == 0) {
+        // Without NUMBER_OF_SETS the first row's length estimates the count:
+        // growing a vector of sets by copies would cost more than the reading.
+        const std::int64_t rowBytes = cells.back().data() + cells.back().size() - cells.front().data() + 2;
+        file.sets.reserve(static_cast<size_t>(std::min<std::int64_t>(bytes_ / rowBytes + bytes_ / rowBytes / 8 + 1, kMaxReserved)));
+    }
     MeasurementSet set;
     set.line = line;
     const auto notANumber = [&](int column) {
@@ -234,6 +243,8 @@ std::optional<ReadError> SetReader::decideScale()
             return contentError(0, "--scale " + std::string(file.scale == 1.0 ? "1" : "100") +
                                        " contradicts the data: " + evidence);
     }
+    const bool resampling = file.fileLayout.firstNm != file.layout.firstNm ||
+                            file.fileLayout.stepNm != file.layout.stepNm || file.fileLayout.bands != file.layout.bands;
     for (MeasurementSet& set : file.sets) {
         for (size_t band = 0; band < set.reflectance.size(); ++band) {
             const std::int32_t raw = set.reflectance[band];
@@ -245,7 +256,8 @@ std::optional<ReadError> SetReader::decideScale()
                                                   (file.scale == 1.0 ? "1" : "100") + " scale (see --scale)");
             set.reflectance[band] = static_cast<std::int32_t>(value);
         }
-        set.reflectance = resample(spectral_, set.reflectance);
+        if (resampling)
+            set.reflectance = resample(spectral_, set.reflectance);
     }
     return std::nullopt;
 }
@@ -414,6 +426,14 @@ std::string MeasurementFile::describeSpectra() const
     const bool same = fileLayout.firstNm == layout.firstNm && fileLayout.stepNm == layout.stepNm &&
                       fileLayout.bands == layout.bands;
     return fileLayout.describe() + (same ? "" : ", resampled to " + layout.describe());
+}
+
+std::string MeasurementFile::describeFields() const
+{
+    std::string list;
+    for (const std::string& field : fields)
+        list += (list.empty() ? "" : ", ") + field;
+    return "its fields: " + cgats::excerpt(list, 100);
 }
 
 std::vector<size_t> MeasurementFile::paperSets() const

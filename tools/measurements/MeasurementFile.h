@@ -60,6 +60,8 @@ struct MeasurementFile {
     std::string keyword(const std::string& name) const;
     // "36 bands 380-730 nm in 10 nm steps", with the resampling when there was one.
     std::string describeSpectra() const;
+    // "its fields: SAMPLE_ID, CMYK_C, ..." cut to about 100 characters, for messages.
+    std::string describeFields() const;
     // The sets measured on paper: every device value 0; in a file without
     // device fields that holds one set, that set.
     std::vector<size_t> paperSets() const;

@@ -130,7 +130,8 @@ void resolveWhite(const std::string& given, const char* option, const Measuremen
             throw ToolError(Failure::InputContent, given + ": a white file holds one measurement, this one " +
                                                        std::to_string(white.file.sets.size()));
         if (!white.file.layout.present())
-            throw ToolError(Failure::InputContent, given + ": the white has no spectral fields");
+            throw ToolError(Failure::InputContent, given + ": the white has no spectral fields; " +
+                                                       white.file.describeFields());
         white.set = &white.file.sets[0];
         white.layout = &white.file.layout;
         white.thousandths = thousandthsOf(*white.set);
@@ -249,7 +250,8 @@ void runConvert(const ConvertOptions& options, std::ostream& out)
     printWarnings(chart, options.chart, std::cerr);
     if (!chart.layout.present() || chart.deviceFields.empty())
         throw ToolError(Failure::InputContent, options.chart + ": a chart needs device fields (CMYK_C ... or "
-                                                               "nCLR_1 ...) and spectral fields");
+                                                               "nCLR_1 ...) and spectral fields; " +
+                                                   chart.describeFields());
     if (!options.cmykOnly)
         refuseDroppedChannels(chart, options.chart);
     const bool copy = options.mode == VM_PROCESS_CHART_COPY;

@@ -136,9 +136,11 @@ PickedPatches pickPatches(const MeasurementFile& file, const std::vector<PatchRe
                           const std::string& fileName)
 {
     if (!file.layout.present())
-        throw ToolError(Failure::InputContent, fileName + ": no spectral fields (SPECTRAL_NM380 ... or nm380 ...)");
+        throw ToolError(Failure::InputContent, fileName + ": no spectral fields (SPECTRAL_NM380, SPEC_380 or nm380 ...); " +
+                                                   file.describeFields());
     if (file.deviceFields.empty())
-        throw ToolError(Failure::InputContent, fileName + ": no device fields (CMYK_C ... CMYK_K or nCLR_1 ... nCLR_n)");
+        throw ToolError(Failure::InputContent, fileName + ": no device fields (CMYK_C ... CMYK_K or nCLR_1 ... nCLR_n); " +
+                                                   file.describeFields());
     const CombinationIndex index(file);
     PickedPatches picked;
     std::vector<bool> used(file.sets.size(), false);
