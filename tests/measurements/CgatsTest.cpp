@@ -57,15 +57,3 @@ TEST(Cgats, ReadsWhatRealFilesHoldAndNamesTheLineOfEachDefect)
         EXPECT_EQ(outcome(test.text).substr(0, std::string(test.result).size()), test.result);
     }
 }
-
-TEST(Cgats, WriterRefusesWhatCgatsCannotHold)
-{
-    const cgats::Document documents[] = {
-        {"CGATS.17", {{"DESCRIPTOR", "6\" strip"}}, {"A"}, {{"1"}}},
-        {"CGATS.17", {}, {"A"}, {{"1\n2"}}},
-        {"CGATS.17", {}, {"A B"}, {{"1"}}},
-        {"CGATS.17", {}, {"A", "B"}, {{"1"}}},
-    };
-    for (const cgats::Document& document : documents)
-        EXPECT_THROW(cgats::write(document), std::invalid_argument);
-}

@@ -17,14 +17,3 @@ TEST(DecimalValues, ParsesDigitsAsWrittenAndRoundsToOddBelowTheUnit)
     for (const auto& [text, units] : cases)
         EXPECT_EQ(parseDecimal(text, 6), units) << text;
 }
-
-TEST(DecimalValues, DividesHalfAwayFromZeroOrToOdd)
-{
-    const std::tuple<std::int64_t, std::int64_t, std::int64_t, std::int64_t> cases[] = {
-        // numerator, denominator, rounded, to odd
-        {1500, 1000, 2, 1}, {-1500, 1000, -2, -1}, {1499, 1000, 1, 1}, {2000, 1000, 2, 2}, {2001, 1000, 2, 3}};
-    for (const auto& [numerator, denominator, rounded, odd] : cases) {
-        EXPECT_EQ(divideRounded(numerator, denominator), rounded) << numerator;
-        EXPECT_EQ(divideToOdd(numerator, denominator), odd) << numerator;
-    }
-}

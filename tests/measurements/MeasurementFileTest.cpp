@@ -129,17 +129,6 @@ TEST(MeasurementFile, WidensUnmeasuredEndBandsAndWarnsAboutImplausibleReadings)
     EXPECT_EQ(read.file->warnings, warnings);
 }
 
-TEST(MeasurementFile, RepeatsAgreeOnTheirDeviceValues)
-{
-    const std::string repeated = form({{kPaper, "0.9"}, {kTint, "0.5"}});
-    const size_t at = repeated.find("\n2\t40");
-    EXPECT_TRUE(readMeasurementText(repeated.substr(0, at) + "\n1\t0" + repeated.substr(at + 5)).ok());
-    const ReadResult duplicate = readMeasurementText(repeated.substr(0, at) + "\n1\t40" + repeated.substr(at + 5));
-    ASSERT_FALSE(duplicate.ok());
-    EXPECT_EQ(duplicate.error.kind, ReadFailure::Duplicate);
-    EXPECT_EQ(duplicate.error.describe(), "line 9: duplicate patch: sample 1 is also on line 8 with other device values");
-}
-
 TEST(MeasurementFile, ReadsTheChartAndSpectralFilesOfDebianColourPackages)
 {
     // argyll-ref (.ti1 .ti2 .sp .cie) and icc-profiles-free (.ti3): read, or refused for their content only.

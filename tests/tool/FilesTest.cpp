@@ -28,26 +28,19 @@ std::pair<int, int> littleCmsCounts(const std::string& text)
 
 TEST(Files, EveryChartTheToolWritesReadsBackInOurReaderAndLittleCms)
 {
-    // The tool's own CGATS, with the cells that need quotes.
-    CgatsTable table{"CGATS.17", {{"ORIGINATOR", "veltmarquist"}, {"DESCRIPTOR", "C, M, Y, K\tcombinations"}},
-                     {"SAMPLE_ID", "SAMPLE_NAME", "CMYK_C"}, {{"1", "paper white", "0"}, {"2", "#2 don't", "2.5"}, {"3", "", "1e-05"}}};
-    const std::string text = cgatsText(table);
-    const auto [read, error] = cgats::readTable(text);
-    ASSERT_FALSE(error) << error->message;
-    EXPECT_EQ(read.header.keywords.at(1).value, "C, M, Y, K\tcombinations");
-    EXPECT_EQ(read.header.fields, table.fields);
-    EXPECT_EQ(read.rows, table.rows);
-    EXPECT_EQ(littleCmsCounts(text), std::make_pair(3, 3));
-    // The library's layouts: XYZ, multi-channel spectral and converted charts.
-    const std::tuple<const char*, int, int> charts[] = {{"offset-form.p0.chart", 900, 8},
-                                                        {"multichannel.p5.chart", 159, 43},
-                                                        {"conversion.p8.chart", 30, 41}};
-    for (const auto& [name, sets, fields] : charts) {
-        SCOPED_TRACE(name);
-        const std::string chart = ts::readFile(ts::goldenPath(name));
-        const auto [ours, oursError] = cgats::readTable(chart);
-        EXPECT_FALSE(oursError) << oursError->message;
+    // The tool's own CGATS, with cells that need quotes, then the library's XYZ, multi-channel and converted charts.
+    const CgatsTable table{"CGATS.17", {{"DESCRIPTOR", "C, M, Y, K\tcombinations"}}, {"SAMPLE_ID", "SAMPLE_NAME", "CMYK_C"},
+                           {{"1", "paper white", "0"}, {"2", "#2 don't", "2.5"}, {"3", "", "1e-05"}}};
+    const std::tuple<std::string, int, int> charts[] = {
+        {cgatsText(table), 3, 3}, {ts::readFile(ts::goldenPath("offset-form.p0.chart")), 900, 8},
+        {ts::readFile(ts::goldenPath("multichannel.p5.chart")), 159, 43},
+        {ts::readFile(ts::goldenPath("conversion.p8.chart")), 30, 41}};
+    for (const auto& [text, sets, fields] : charts) {
+        SCOPED_TRACE(text.substr(0, 20));
+        const auto [ours, error] = cgats::readTable(text);
+        EXPECT_FALSE(error);
         EXPECT_EQ(ours.rows.size(), static_cast<size_t>(sets));
-        EXPECT_EQ(littleCmsCounts(chart), std::make_pair(sets, fields));
+        EXPECT_EQ(littleCmsCounts(text), std::make_pair(sets, fields));
     }
+    EXPECT_EQ(cgats::readTable(cgatsText(table)).first.rows, table.rows);
 }
