@@ -58,6 +58,7 @@ struct ConvertOptions {
     std::string to;
     std::string output;
     PrintProcess mode = VM_PROCESS_CHART_CONVERT;
+    bool cmykOnly = false; // drop ink in channels 5-7 instead of refusing the chart
     ReadOptions read;
 };
 void runConvert(const ConvertOptions& options, std::ostream& out);

@@ -1,104 +1,106 @@
-// Reading input files, writing outputs through a temporary file, and CGATS
-// text of the tool's own.
+// Reading measurement files with the tool's messages, and CGATS text of the
+// tool's own.
 #include "Files.h"
 
+#include "LibraryHost.h"
+#include "PatchMatching.h"
 #include "ToolError.h"
 
-#include <lcms2.h>
-
-#include <sys/stat.h>
-
-#include <cerrno>
 #include <cstdio>
-#include <cstring>
-#include <fstream>
-#include <memory>
-#include <sstream>
+#include <stdexcept>
 
 namespace veltmarquist {
 
 namespace {
 
-bool isFolder(const std::string& path)
+Failure failureOf(ReadFailure kind)
 {
-    struct stat status {};
-    return ::stat(path.c_str(), &status) == 0 && S_ISDIR(status.st_mode);
+    switch (kind) {
+    case ReadFailure::Unreadable:
+        return Failure::InputUnreadable;
+    case ReadFailure::Content:
+        return Failure::InputContent;
+    case ReadFailure::Duplicate:
+        return Failure::DuplicatePatch;
+    case ReadFailure::Syntax:
+        break;
+    }
+    return Failure::InputSyntax;
 }
 
-std::string folderOf(const std::string& path)
+double paperY(const MeasurementFile& file, const std::vector<size_t>& sets)
 {
-    const size_t slash = path.rfind('/');
-    return slash == std::string::npos ? std::string() : path.substr(0, slash + 1);
+    const std::vector<int> thousandths = averageThousandths(file, sets);
+    return XYZOfBands(libraryBands({&file.layout, &thousandths}))[1];
+}
+
+std::string oneDecimal(double value)
+{
+    char text[32];
+    std::snprintf(text, sizeof text, "%.1f", value);
+    return text;
+}
+
+// A paper is the brightest thing on the sheet, and brighter than Y 20.
+void warnAboutPaper(MeasurementFile& file)
+{
+    const std::vector<size_t> paper = file.paperSets();
+    if (paper.empty() || !file.layout.present())
+        return;
+    const double Y = paperY(file, paper);
+    if (Y < 20.0)
+        file.warnings.push_back("the paper (" + file.sets[paper[0]].where() + ") has Y " + oneDecimal(Y) +
+                                ": a paper is far brighter; is it measured on black, or is it not the paper?");
+    const CombinationIndex index(file);
+    for (size_t channel = 0; channel < file.deviceFields.size() && channel < 4; ++channel) {
+        std::vector<double> solid(file.deviceFields.size(), 0.0);
+        solid[channel] = 100.0;
+        const std::vector<size_t>& sets = index.find(solid);
+        if (sets.empty() || paperY(file, sets) <= Y)
+            continue;
+        file.warnings.push_back("the paper (Y " + oneDecimal(Y) + ") is darker than the solid " +
+                                file.deviceFields[channel] + " 100 (" + file.sets[sets[0]].where() + ", Y " +
+                                oneDecimal(paperY(file, sets)) + "): are paper and solid swapped?");
+    }
 }
 
 } // namespace
 
-std::string readTextFile(const std::string& path)
-{
-    if (isFolder(path))
-        throw ToolError(Failure::InputUnreadable, path + ": is a folder, not a file");
-    std::ifstream in(path, std::ios::binary);
-    if (!in)
-        throw ToolError(Failure::InputUnreadable, path + ": cannot open: " + std::strerror(errno));
-    std::ostringstream text;
-    text << in.rdbuf();
-    if (in.bad())
-        throw ToolError(Failure::InputUnreadable, path + ": read error");
-    return text.str();
-}
-
 MeasurementFile loadMeasurementFile(const std::string& path, const ReadOptions& options)
 {
-    ReadResult result = readMeasurementText(readTextFile(path), options);
+    ReadResult result = readMeasurementFile(path, options);
     if (!result.ok()) {
         const ReadError& error = result.error;
         const std::string where = error.line > 0 ? path + ":" + std::to_string(error.line) : path;
-        throw ToolError(error.kind, where + ": " + error.message);
+        throw ToolError(failureOf(error.kind), where + ": " + error.message);
     }
+    warnAboutPaper(*result.file);
     return std::move(*result.file);
+}
+
+void printWarnings(const MeasurementFile& file, const std::string& path, std::ostream& err)
+{
+    for (const std::string& warning : file.warnings)
+        err << "veltmarquist: warning: " << path << ": " << warning << "\n";
 }
 
 std::string fileStem(const std::string& path)
 {
-    std::string base = path.substr(folderOf(path).size());
+    const size_t slash = path.rfind('/');
+    std::string base = slash == std::string::npos ? path : path.substr(slash + 1);
     const size_t dot = base.rfind('.');
     if (dot != std::string::npos && dot > 0)
         base.erase(dot);
     return base;
 }
 
-// ---- CGATS text ----------------------------------------------------------------------------
-
 std::string cgatsText(const CgatsTable& table)
 {
-    struct Deleter {
-        void operator()(void* handle) const { cmsIT8Free(handle); }
-    };
-    std::unique_ptr<void, Deleter> handle(cmsIT8Alloc(nullptr));
-    if (!handle)
-        throw ToolError(Failure::Internal, "cannot create a CGATS table");
-    void* it8 = handle.get();
-    bool ok = cmsIT8SetSheetType(it8, "CGATS.17");
-    for (const auto& [key, value] : table.keywords)
-        ok = ok && cmsIT8SetPropertyStr(it8, key.c_str(), value.c_str());
-    ok = ok && cmsIT8SetPropertyDbl(it8, "NUMBER_OF_FIELDS", static_cast<double>(table.fields.size()));
-    for (size_t field = 0; field < table.fields.size(); ++field)
-        ok = ok && cmsIT8SetDataFormat(it8, static_cast<int>(field), table.fields[field].c_str());
-    ok = ok && cmsIT8SetPropertyDbl(it8, "NUMBER_OF_SETS", static_cast<double>(table.rows.size()));
-    for (size_t row = 0; row < table.rows.size(); ++row)
-        for (size_t field = 0; field < table.rows[row].size(); ++field)
-            ok = ok && cmsIT8SetDataRowCol(it8, static_cast<int>(row), static_cast<int>(field),
-                                           table.rows[row][field].c_str());
-    cmsUInt32Number size = 0;
-    ok = ok && cmsIT8SaveToMem(it8, nullptr, &size);
-    std::string text(size, '\0');
-    ok = ok && cmsIT8SaveToMem(it8, &text[0], &size);
-    if (!ok)
-        throw ToolError(Failure::Internal, "cannot write a CGATS table");
-    // The writer counts the terminating NUL.
-    while (!text.empty() && text.back() == '\0')
-        text.pop_back();
-    return text;
+    try {
+        return cgats::write(table);
+    } catch (const std::invalid_argument& error) {
+        throw ToolError(Failure::Internal, std::string("cannot write a CGATS table: ") + error.what());
+    }
 }
 
 } // namespace veltmarquist

@@ -1,30 +1,27 @@
-// Files of the tool: reading measurement files from disk and writing CGATS
-// text of the tool's own. Outputs go through OutputFile.h.
+// Files of the tool: measurement files read from disk with the tool's
+// messages and warnings, and CGATS text of the tool's own. Outputs go
+// through OutputFile.h.
 #ifndef VELTMARQUIST_TOOL_FILES_H
 #define VELTMARQUIST_TOOL_FILES_H
 
+#include "Cgats.h"
 #include "MeasurementFile.h"
 
+#include <ostream>
 #include <string>
-#include <utility>
-#include <vector>
 
 namespace veltmarquist {
 
-// The whole file; InputUnreadable when it cannot be opened or read.
-std::string readTextFile(const std::string& path);
-
 // Reads and parses a measurement file; errors become ToolErrors that name
-// the file and line.
+// the file and line. Adds the warnings that need colorimetry: a paper with Y
+// below 20, a paper darker than one of its solids.
 MeasurementFile loadMeasurementFile(const std::string& path, const ReadOptions& options);
 
-// A CGATS.17 text of the tool's own, written by LittleCMS's IT8 writer:
-// keywords, field names, and rows of already formatted values.
-struct CgatsTable {
-    std::vector<std::pair<std::string, std::string>> keywords; // ORIGINATOR, DESCRIPTOR, ...
-    std::vector<std::string> fields;
-    std::vector<std::vector<std::string>> rows;
-};
+// The file's warnings, one line each: "veltmarquist: warning: PATH: ...".
+void printWarnings(const MeasurementFile& file, const std::string& path, std::ostream& err);
+
+// A CGATS.17 text of the tool's own (the reader's writer).
+using CgatsTable = cgats::Document;
 std::string cgatsText(const CgatsTable& table);
 
 // "chart.txt" -> "chart"; "forms/press 4.cgats.txt" -> "press 4.cgats".

@@ -9,6 +9,7 @@
 #include "ToolError.h"
 
 #include <cstdio>
+#include <iostream>
 #include <set>
 #include <sstream>
 
@@ -38,13 +39,14 @@ struct TestForm {
 TestForm readTestForm(const std::string& path, const ReadOptions& read, std::ostream& out)
 {
     TestForm form{loadMeasurementFile(path, read), {}, {}};
+    printWarnings(form.file, path, std::cerr);
     form.picked = pickPatches(form.file, testFormRequests(), path);
     std::vector<Spectrum> spectra;
-    for (const std::vector<double>& reflectance : form.picked.reflectance)
-        spectra.push_back({&form.file.layout, &reflectance});
+    for (const std::vector<int>& thousandths : form.picked.thousandths)
+        spectra.push_back({&form.file.layout, &thousandths});
     form.block = buildBlock(spectra);
 
-    out << "form: " << path << ": " << form.file.sets.size() << " measurements, " << form.file.layout.describe()
+    out << "form: " << path << ": " << form.file.sets.size() << " measurements, " << form.file.describeSpectra()
         << ", reflectance 0-" << number(form.file.scale) << (form.file.scaleDetected ? " (detected)" : " (given)")
         << "\n  46 test-form patches found in " << form.picked.setsUsed << " measurements";
     if (form.picked.averaged > 0)
@@ -97,17 +99,17 @@ void checkAgainstMeasurements(const TestForm& form, const std::string& chartPath
     double worst = -1.0;
     std::string worstPatch;
     for (const MeasurementSet& set : chart.sets) {
-        if (!skip.insert(CombinationIndex::keyOf(set.device)).second)
+        if (!skip.insert(CombinationIndex::keyOf(set)).second)
             continue;
-        const std::vector<size_t>& sets = measured.find(set.device);
+        const std::vector<size_t>& sets = measured.find(set.devicePercent());
         if (sets.empty())
             continue;
-        const std::vector<double> reflectance = measured.averageReflectance(sets);
-        const Lab truth = labOfXYZ(XYZOfBands(libraryBands({&form.file.layout, &reflectance})));
+        const std::vector<int> thousandths = averageThousandths(form.file, sets);
+        const Lab truth = labOfXYZ(XYZOfBands(libraryBands({&form.file.layout, &thousandths})));
         differences.push_back(deltaE2000(truth, labOfXYZ(set.XYZ)));
         if (differences.back() > worst) {
             worst = differences.back();
-            worstPatch = describeDevice(set.device);
+            worstPatch = describeDevice(set.devicePercent());
         }
     }
     if (differences.empty())
@@ -191,7 +193,7 @@ void runCompare(const CompareOptions& options, std::ostream& out)
         ab.push_back(deltaEab(truth, model));
         de2000.push_back(deltaE2000(truth, model));
         char line[96];
-        const std::vector<double>& device = measured.sets[i].device;
+        const std::vector<double> device = measured.sets[i].devicePercent();
         std::snprintf(line, sizeof line, "%5zu  %-4g %-4g %-4g %-4g %6.2f %6.2f\n", i + 1, device[0], device[1],
                       device[2], device[3], ab.back(), de2000.back());
         table << line;

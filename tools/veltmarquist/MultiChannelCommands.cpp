@@ -3,6 +3,7 @@
 // from one paper white to another).
 #include "Commands.h"
 
+#include "DecimalValues.h"
 #include "Files.h"
 #include "OutputFile.h"
 #include "LibraryHost.h"
@@ -11,8 +12,10 @@
 
 #include <sys/stat.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstdint>
+#include <iostream>
 #include <memory>
 
 namespace veltmarquist {
@@ -111,6 +114,7 @@ struct White {
     MeasurementFile file;              // when read from a file of its own
     const MeasurementSet* set = nullptr;
     const SpectralLayout* layout = nullptr;
+    std::vector<int> thousandths;
     size_t chartIndex = SIZE_MAX;      // position in the chart when named there
 };
 
@@ -121,13 +125,16 @@ void resolveWhite(const std::string& given, const char* option, const Measuremen
 {
     if (isRegularFile(given)) {
         white.file = loadMeasurementFile(given, read);
+        printWarnings(white.file, given, std::cerr);
         if (white.file.sets.size() != 1)
             throw ToolError(Failure::InputContent, given + ": a white file holds one measurement, this one " +
                                                        std::to_string(white.file.sets.size()));
         if (!white.file.layout.present())
-            throw ToolError(Failure::InputContent, given + ": the white has no spectral fields");
+            throw ToolError(Failure::InputContent, given + ": the white has no spectral fields; " +
+                                                       white.file.describeFields());
         white.set = &white.file.sets[0];
         white.layout = &white.file.layout;
+        white.thousandths = thousandthsOf(*white.set);
         white.label = given;
         return;
     }
@@ -146,7 +153,23 @@ void resolveWhite(const std::string& given, const char* option, const Measuremen
         throw ToolError(Failure::MissingPatch, chartPath + ": the " + std::string(option) + " white '" + given +
                                                    "' is neither a file nor a sample name in the chart");
     white.layout = &chart.layout;
+    white.thousandths = thousandthsOf(*white.set);
     white.label = "'" + given + "'";
+}
+
+// The converted chart holds C, M, Y, K only: a chart with ink in further
+// channels is refused unless the user says they may go.
+void refuseDroppedChannels(const MeasurementFile& chart, const std::string& path)
+{
+    size_t inked = 0;
+    for (const MeasurementSet& set : chart.sets)
+        inked += std::any_of(set.device.begin() + std::min<std::ptrdiff_t>(4, static_cast<std::ptrdiff_t>(set.device.size())),
+                             set.device.end(), [](std::int32_t value) { return value != 0; });
+    if (inked > 0)
+        throw ToolError(Failure::InputContent,
+                        path + ": " + std::to_string(inked) + " patches have ink in channels 5-" +
+                            std::to_string(chart.deviceFields.size()) + " (" + chart.deviceFields[4] + " ...), but the "
+                            "converted chart holds C, M, Y, K only; give --cmyk-only to drop those channels");
 }
 
 } // namespace
@@ -156,6 +179,7 @@ void runMultiChannel(const MultiChannelOptions& options, std::ostream& out)
     refuseClashingOutputs({options.form, options.separations},
                           {options.output, options.combinations, options.separatedOutput});
     const MeasurementFile form = loadMeasurementFile(options.form, options.read);
+    printWarnings(form, options.form, std::cerr);
     const std::string family = std::to_string(options.inks) + "CLR_";
     if (form.deviceFields.size() != static_cast<size_t>(options.inks))
         throw ToolError(Failure::InputContent, options.form + ": " + std::to_string(options.inks) +
@@ -163,7 +187,7 @@ void runMultiChannel(const MultiChannelOptions& options, std::ostream& out)
                                                    std::to_string(options.inks) + "; the file has " +
                                                    std::to_string(form.deviceFields.size()) + " device channels");
     const PickedPatches picked = pickPatches(form, multiChannelRequests(options.inks), options.form);
-    out << "form: " << options.form << ": " << form.sets.size() << " measurements, " << form.layout.describe()
+    out << "form: " << options.form << ": " << form.sets.size() << " measurements, " << form.describeSpectra()
         << ", reflectance 0-" << (form.scale == 100.0 ? "100" : "1") << (form.scaleDetected ? " (detected)" : " (given)")
         << "\n  paper and " << options.inks << " solids found; " << picked.setsIgnored
         << " other measurements ignored\n";
@@ -175,6 +199,7 @@ void runMultiChannel(const MultiChannelOptions& options, std::ostream& out)
     std::vector<int> channels;
     if (!options.separations.empty()) {
         separations = loadMeasurementFile(options.separations, options.read);
+        printWarnings(separations, options.separations, std::cerr);
         channels = separationChannels(separations, options.inks, options.separations);
         records = orderSeparations(separations, options.separations);
     }
@@ -187,8 +212,8 @@ void runMultiChannel(const MultiChannelOptions& options, std::ostream& out)
         separated = std::make_unique<PendingOutput>(options.separatedOutput);
 
     std::vector<Spectrum> spectra;
-    for (const std::vector<double>& reflectance : picked.reflectance)
-        spectra.push_back({&form.layout, &reflectance});
+    for (const std::vector<int>& thousandths : picked.thousandths)
+        spectra.push_back({&form.layout, &thousandths});
     MeasurementBlock block = buildBlock(spectra, VM_EXCHANGE_BUFFER_INTS);
     Profile profile(fileStem(options.form));
     profile.calculate(options.inks == 6 ? VM_PROCESS_SIX_COLOUR : VM_PROCESS_SEVEN_COLOUR, chart, block);
@@ -201,7 +226,7 @@ void runMultiChannel(const MultiChannelOptions& options, std::ostream& out)
                 block.ints[7 * record + channel] = 0;
             for (size_t channel = 0; channel < channels.size(); ++channel)
                 block.ints[7 * record + static_cast<size_t>(channels[channel])] =
-                    static_cast<int>(std::lround(records[record]->device[channel] * 1000.0));
+                    static_cast<int>(divideRounded(records[record]->device[channel], kDeviceUnits / 1000));
         }
         profile.calculate(VM_PROCESS_SEPARATED_SET, *separated, block);
     }
@@ -225,9 +250,13 @@ void runConvert(const ConvertOptions& options, std::ostream& out)
 {
     refuseClashingOutputs({options.chart, options.from, options.to}, {options.output});
     const MeasurementFile chart = loadMeasurementFile(options.chart, options.read);
+    printWarnings(chart, options.chart, std::cerr);
     if (!chart.layout.present() || chart.deviceFields.empty())
         throw ToolError(Failure::InputContent, options.chart + ": a chart needs device fields (CMYK_C ... or "
-                                                               "nCLR_1 ...) and spectral fields");
+                                                               "nCLR_1 ...) and spectral fields; " +
+                                                   chart.describeFields());
+    if (!options.cmykOnly)
+        refuseDroppedChannels(chart, options.chart);
     const bool copy = options.mode == VM_PROCESS_CHART_COPY;
     White from, to;
     if (!options.from.empty())
@@ -244,13 +273,18 @@ void runConvert(const ConvertOptions& options, std::ostream& out)
         throw ToolError(Failure::InputContent, options.chart + ": " + std::to_string(patches.size()) +
                                                    " patches; at most 1997 can be converted in one chart");
 
-    std::vector<Spectrum> spectra;
+    std::vector<std::vector<int>> thousandths;
     for (const MeasurementSet* patch : patches)
-        spectra.push_back({&chart.layout, &patch->reflectance});
+        thousandths.push_back(thousandthsOf(*patch));
+    if (thousandths.empty())
+        thousandths.push_back(thousandthsOf(chart.sets[0]));
+    std::vector<Spectrum> spectra;
+    for (size_t i = 0; i < patches.size(); ++i)
+        spectra.push_back({&chart.layout, &thousandths[i]});
     // A copy reads no white; two copies of the first patch stand in for them.
-    const Spectrum first = spectra.empty() ? Spectrum{&chart.layout, &chart.sets[0].reflectance} : spectra[0];
-    spectra.push_back(from.set != nullptr ? Spectrum{from.layout, &from.set->reflectance} : first);
-    spectra.push_back(to.set != nullptr ? Spectrum{to.layout, &to.set->reflectance} : first);
+    const Spectrum first{&chart.layout, &thousandths[0]};
+    spectra.push_back(from.set != nullptr ? Spectrum{from.layout, &from.thousandths} : first);
+    spectra.push_back(to.set != nullptr ? Spectrum{to.layout, &to.thousandths} : first);
     MeasurementBlock block = buildBlock(spectra);
 
     double whitesApart = 0.0;
@@ -268,7 +302,9 @@ void runConvert(const ConvertOptions& options, std::ostream& out)
     // Channel values follow the spectra, seven whole percentages per patch.
     for (const MeasurementSet* patch : patches)
         for (size_t channel = 0; channel < 7; ++channel)
-            block.ints.push_back(channel < patch->device.size() ? static_cast<int>(std::lround(patch->device[channel])) : 0);
+            block.ints.push_back(channel < patch->device.size()
+                                     ? static_cast<int>(divideRounded(patch->device[channel], kDeviceUnits))
+                                     : 0);
     block.ints.insert(block.ints.end(), 14, 0);
 
     PendingOutput output(options.output);

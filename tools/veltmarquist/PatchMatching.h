@@ -22,7 +22,8 @@ namespace veltmarquist {
 // file order: C, M, Y, K, then further inks; missing channels count as 0).
 struct PatchRequest {
     std::vector<double> device;
-    std::string label; // "test-form patch 18 (C 0 M 90 Y 0 K 0)"
+    std::string kind;  // "test-form patch"; requests of one kind are listed together
+    std::string label; // "18 (C 0 M 90 Y 0 K 0)"
 };
 
 // The 46 patches of the four-colour test form, in measuring order.
@@ -38,29 +39,27 @@ std::string describeDevice(const std::vector<double>& device);
 class CombinationIndex {
 public:
     explicit CombinationIndex(const MeasurementFile& file);
-    // Indices of the sets measured with these device values; empty if none.
+    // Indices of the sets measured with these device values (percent); empty if none.
     const std::vector<size_t>& find(const std::vector<double>& device) const;
-    // Mean reflectance of the sets measured with these device values.
-    std::vector<double> averageReflectance(const std::vector<size_t>& sets) const;
     size_t combinations() const { return sets_.size(); }
 
     using Key = std::vector<long>;
     static Key keyOf(const std::vector<double>& device);
+    static Key keyOf(const MeasurementSet& set);
 
 private:
-    const MeasurementFile& file_;
     std::map<Key, std::vector<size_t>> sets_;
 };
 
 struct PickedPatches {
-    std::vector<std::vector<double>> reflectance; // one averaged spectrum per request
+    std::vector<std::vector<int>> thousandths;    // one averaged spectrum per request
     size_t averaged = 0;                          // requests with more than one measurement
     size_t setsUsed = 0;                          // sets of the file that went into them
     size_t setsIgnored = 0;                       // sets of the file that no request uses
 };
 
-// Finds every request in the file. A request that is not there is a
-// MissingPatch error naming the patch and the file.
+// Finds every request in the file. Requests that are not there are one
+// MissingPatch error naming the file and every missing patch.
 PickedPatches pickPatches(const MeasurementFile& file, const std::vector<PatchRequest>& requests,
                           const std::string& fileName);
 
@@ -75,11 +74,13 @@ struct MeasurementBlock {
     std::vector<int> ints;
 };
 
-// A spectrum and the layout of its bands.
+// A spectrum in the library's thousandths and the layout of its bands.
 struct Spectrum {
     const SpectralLayout* layout;
-    const std::vector<double>* reflectance;
+    const std::vector<int>* thousandths;
 };
+// The thousandths of one set.
+std::vector<int> thousandthsOf(const MeasurementSet& set);
 
 // The block of the spectra, padded with zeros to at least `minimumInts`.
 // Spectra of 16 bands (all of them) go in as input kind 20; everything else as

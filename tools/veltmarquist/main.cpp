@@ -53,7 +53,7 @@ void addScale(CLI::App& command, std::string& scale)
 {
     command
         .add_option("--scale", scale,
-                    "reflectance scale of the input spectra: auto (values above 2 mean percent), 1 or 100")
+                    "reflectance scale of the input spectra: auto (decided from the paper and the bulk of the values), 1 or 100")
         ->check(CLI::IsMember({"auto", "1", "100"}))
         ->capture_default_str();
 }
@@ -181,6 +181,8 @@ int main(int argc, char** argv)
         ->check(CLI::IsMember({"copy", "convert", "blend"}))
         ->capture_default_str();
     convertCommand->add_option("-o,--output", convert.output, "spectral chart to write")->required();
+    convertCommand->add_flag("--cmyk-only", convert.cmykOnly,
+                             "drop channels 5-7 (the converted chart holds C, M, Y, K only) instead of refusing");
     addScale(*convertCommand, scale);
 
     // A closed pipe shows as EPIPE where the tool writes: the report stops

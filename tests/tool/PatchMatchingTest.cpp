@@ -1,0 +1,113 @@
+// Patch matching and the library's measurement block, from golden test forms written as CGATS.
+#include "../TestSupport.h"
+#include "Cgats.h"
+#include "MeasurementFile.h"
+#include "PatchMatching.h"
+#include "ToolError.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <random>
+
+using namespace veltmarquist;
+namespace ts = testsupport;
+
+namespace {
+
+// The 46 patches of a golden four-colour input as a CGATS document, reflectance 0-1 as "0.512".
+cgats::Document goldenForm(const ts::MeasurementBlock& block)
+{
+    cgats::Document form;
+    form.fields = {"SAMPLE_ID", "CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K"};
+    for (int j = 0; j < block.valuesPerPatch; ++j)
+        form.fields.push_back(block.inputKind == 20 ? "nm" + std::to_string(400 + 20 * j)
+                                                    : "SPECTRAL_NM" + std::to_string(block.firstWavelength + 10 * j));
+    for (int patch = 0; patch < 46; ++patch) {
+        std::vector<std::string> row{std::to_string(patch + 1)};
+        for (int channel = 0; channel < 4; ++channel)
+            row.push_back(std::to_string(MathProfile::dithering[patch][channel]));
+        for (int j = 0; j < block.valuesPerPatch; ++j)
+            row.push_back(std::to_string(block.ints[static_cast<size_t>(patch * block.valuesPerPatch + j)] / 1e3));
+        form.rows.push_back(std::move(row));
+    }
+    return form;
+}
+
+MeasurementBlock blockOf(const cgats::Document& form)
+{
+    const ReadResult read = readMeasurementText(cgats::write(form));
+    EXPECT_TRUE(read.ok()) << read.error.describe();
+    const PickedPatches picked = pickPatches(*read.file, testFormRequests(), "form.txt");
+    std::vector<Spectrum> spectra;
+    for (const std::vector<int>& thousandths : picked.thousandths)
+        spectra.push_back({&read.file->layout, &thousandths});
+    return buildBlock(spectra);
+}
+
+} // namespace
+
+TEST(PatchMatching, ShuffledRepeatedAndNearbyPatchesGiveTheGoldenBlock)
+{
+    for (const char* name : {"offset-form.in", "offset-form-k20.in"}) {
+        SCOPED_TRACE(name);
+        const ts::MeasurementBlock golden = ts::readGoldenInput(name);
+        cgats::Document form = goldenForm(golden);
+        // Every patch measured three times, identically: the block is the golden one to the last int.
+        cgats::Document thrice = form;
+        for (int copy = 0; copy < 2; ++copy)
+            thrice.rows.insert(thrice.rows.end(), form.rows.begin(), form.rows.end());
+        std::shuffle(thrice.rows.begin(), thrice.rows.end(), std::mt19937(46));
+        const MeasurementBlock block = blockOf(thrice);
+        EXPECT_EQ(block.inputKind, golden.inputKind);
+        EXPECT_EQ(block.ints, std::vector<int>(golden.ints.begin(), golden.ints.begin() + 46 * golden.valuesPerPatch));
+        // Magenta 0.04 % off is the patch, 0.06 % off another; the paper again with 0.5: averaged, half away from 0.
+        form.rows[17][2] = "89.96";
+        form.rows.push_back(form.rows[17]);
+        form.rows.back()[0] = "100";
+        form.rows.back()[2] = "89.94";
+        form.rows.push_back(form.rows[1]);
+        form.rows.back()[0] = "101";
+        std::fill(form.rows.back().begin() + 5, form.rows.back().end(), "0.5");
+        const MeasurementBlock nearby = blockOf(form);
+        for (size_t i = 0; i < nearby.ints.size(); ++i) {
+            const bool paper = i / static_cast<size_t>(golden.valuesPerPatch) == 1;
+            ASSERT_EQ(nearby.ints[i], paper ? (golden.ints[i] + 501) / 2 : golden.ints[i]) << i;
+        }
+    }
+}
+
+TEST(PatchMatching, EveryMissingPatchIsNamedInOneLine)
+{
+    cgats::Document form = goldenForm(ts::readGoldenInput("offset-form.in"));
+    form.rows.erase(form.rows.begin() + 17, form.rows.begin() + 20);
+    const ReadResult read = readMeasurementText(cgats::write(form));
+    ASSERT_TRUE(read.ok()) << read.error.describe();
+    try {
+        pickPatches(*read.file, testFormRequests(), "form.txt");
+        FAIL() << "three patches are missing";
+    } catch (const ToolError& error) {
+        EXPECT_EQ(error.failure(), Failure::MissingPatch);
+        EXPECT_STREQ(error.what(), "form.txt: 3 test-form patches are missing: 18 (C 0 M 90 Y 0 K 0), "
+                                   "19 (C 100 M 100 Y 100 K 100), 20 (C 0 M 0 Y 100 K 0)");
+    }
+}
+
+TEST(PatchMatching, OtherLayoutsAreWidenedAsTheLibraryWould)
+{
+    const SpectralLayout narrow{400, 10, 31}, sixteen{400, 20, 16};
+    std::vector<int> fine(31), coarse(16);
+    for (int j = 0; j < 31; ++j)
+        fine[j] = 100 + 10 * j;
+    for (int j = 0; j < 16; ++j)
+        coarse[j] = 200 + 20 * j;
+    // 400-700 nm in 10 nm steps, alone (bands outside repeat the first and last one) and mixed with 16 bands
+    // widened as the library would, as they are in the rows of the class methods.
+    const MeasurementBlock mixed = buildBlock({{&narrow, &fine}, {&sixteen, &coarse}}, 100);
+    RowTable rows(buildBlock({{&sixteen, &coarse}}));
+    const std::pair<size_t, int> ints[] = {{0, 100}, {2, 100}, {3, 110}, {35, 400}, {36, 220}, {41, 230}, {71, 500}};
+    for (const auto& [index, value] : ints) // 380, 400, 410, 730 nm; 16 bands at 380 (takes 420), 430 (between), 730
+        EXPECT_EQ(mixed.ints[index], value) << "int " << index;
+    EXPECT_DOUBLE_EQ(rows.rows()[0][5], 0.230);
+    EXPECT_EQ(rows.rows()[1], nullptr);
+}
