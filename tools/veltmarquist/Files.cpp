@@ -2,6 +2,8 @@
 // tool's own.
 #include "Files.h"
 
+#include "Messages.h"
+
 #include "LibraryHost.h"
 #include "PatchMatching.h"
 #include "ToolError.h"
@@ -78,10 +80,10 @@ MeasurementFile loadMeasurementFile(const std::string& path, const ReadOptions& 
     return std::move(*result.file);
 }
 
-void printWarnings(const MeasurementFile& file, const std::string& path, std::ostream& err)
+void printWarnings(const MeasurementFile& file, const std::string& path)
 {
     for (const std::string& warning : file.warnings)
-        err << "veltmarquist: warning: " << path << ": " << warning << "\n";
+        printMessage("warning", path + ": " + warning);
 }
 
 std::string fileStem(const std::string& path)

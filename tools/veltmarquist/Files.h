@@ -18,7 +18,7 @@ namespace veltmarquist {
 MeasurementFile loadMeasurementFile(const std::string& path, const ReadOptions& options);
 
 // The file's warnings, one line each: "veltmarquist: warning: PATH: ...".
-void printWarnings(const MeasurementFile& file, const std::string& path, std::ostream& err);
+void printWarnings(const MeasurementFile& file, const std::string& path);
 
 // A CGATS.17 text of the tool's own (the reader's writer).
 using CgatsTable = cgats::Document;

@@ -39,7 +39,7 @@ struct TestForm {
 TestForm readTestForm(const std::string& path, const ReadOptions& read, std::ostream& out)
 {
     TestForm form{loadMeasurementFile(path, read), {}, {}};
-    printWarnings(form.file, path, std::cerr);
+    printWarnings(form.file, path);
     form.picked = pickPatches(form.file, testFormRequests(), path);
     std::vector<Spectrum> spectra;
     for (const std::vector<int>& thousandths : form.picked.thousandths)

@@ -125,7 +125,7 @@ void resolveWhite(const std::string& given, const char* option, const Measuremen
 {
     if (isRegularFile(given)) {
         white.file = loadMeasurementFile(given, read);
-        printWarnings(white.file, given, std::cerr);
+        printWarnings(white.file, given);
         if (white.file.sets.size() != 1)
             throw ToolError(Failure::InputContent, given + ": a white file holds one measurement, this one " +
                                                        std::to_string(white.file.sets.size()));
@@ -179,7 +179,7 @@ void runMultiChannel(const MultiChannelOptions& options, std::ostream& out)
     refuseClashingOutputs({options.form, options.separations},
                           {options.output, options.combinations, options.separatedOutput});
     const MeasurementFile form = loadMeasurementFile(options.form, options.read);
-    printWarnings(form, options.form, std::cerr);
+    printWarnings(form, options.form);
     const std::string family = std::to_string(options.inks) + "CLR_";
     if (form.deviceFields.size() != static_cast<size_t>(options.inks))
         throw ToolError(Failure::InputContent, options.form + ": " + std::to_string(options.inks) +
@@ -199,7 +199,7 @@ void runMultiChannel(const MultiChannelOptions& options, std::ostream& out)
     std::vector<int> channels;
     if (!options.separations.empty()) {
         separations = loadMeasurementFile(options.separations, options.read);
-        printWarnings(separations, options.separations, std::cerr);
+        printWarnings(separations, options.separations);
         channels = separationChannels(separations, options.inks, options.separations);
         records = orderSeparations(separations, options.separations);
     }
@@ -250,7 +250,7 @@ void runConvert(const ConvertOptions& options, std::ostream& out)
 {
     refuseClashingOutputs({options.chart, options.from, options.to}, {options.output});
     const MeasurementFile chart = loadMeasurementFile(options.chart, options.read);
-    printWarnings(chart, options.chart, std::cerr);
+    printWarnings(chart, options.chart);
     if (!chart.layout.present() || chart.deviceFields.empty())
         throw ToolError(Failure::InputContent, options.chart + ": a chart needs device fields (CMYK_C ... or "
                                                                "nCLR_1 ...) and spectral fields; " +
