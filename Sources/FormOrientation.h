@@ -15,7 +15,7 @@ bool readInSwappedHalves(const double* const* rows, double normFactor);
 
 // Exchanges rows i and i + 24 for i = 0..22. A form of 46 rows has no row 46:
 // the exchange stops at the first null row, so there row 22 stays.
-void exchangeHalves(double** rows);
+void exchangeHalves(double* const* rows);
 
 } // namespace formorientation
 

@@ -117,7 +117,7 @@ bool readInSwappedHalves(const double* const* rows, double normFactor)
     return Z[1] > Z[0] && Z[3] > Z[2];
 }
 
-void exchangeHalves(double** rows)
+void exchangeHalves(double* const* rows)
 {
     for (int i = 0; i <= 22; ++i) {
         if (rows[i + 24] == nullptr)
