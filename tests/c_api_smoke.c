@@ -1,5 +1,6 @@
 /* A host written in C: includes the public header as C, checks the version
- * symbols and runs the chart copy (process 7) on a small block. */
+ * symbols, runs the chart copy (process 7) on a small block, and fits and
+ * predicts a print model. */
 #include "VeltmarquistDLL.h"
 
 #include <stdio.h>
@@ -13,8 +14,13 @@ int main(int argc, char **argv)
     char path[4096], text[8192];
     size_t length;
     FILE *chart;
-    void *profile;
+    void *profile, *model = NULL;
     int i, status;
+    /* A form of 46 patches: every patch 500, the paper (patch 1) 900. */
+    int form[46 * 36];
+    const double cmyk[2 * 4] = {0, 0, 0, 0, 35, 0, 0, 0};
+    double spectra[2 * 36], Lab[2 * 3];
+    const char *name = NULL;
 
     if (argc != 2)
         return 2;
@@ -52,6 +58,22 @@ int main(int argc, char **argv)
         fprintf(stderr, "unexpected chart:\n%s", text);
         return 1;
     }
-    puts("C host: chart written");
+    for (i = 0; i < 46 * 36; ++i)
+        form[i] = i / 36 == 1 ? 900 : 500;
+    status = FitPrintModel(VM_MODEL_GRAVURE, form, VM_INPUT_10NM, 380, 36, 46, &model);
+    if (status != VM_STATUS_OK || DescribePrintModel(model, &name, NULL, NULL, NULL) != VM_STATUS_OK ||
+        strcmp(name, "gravure") != 0) {
+        fprintf(stderr, "fitting the gravure model gave %d\n", status);
+        return 1;
+    }
+    /* The paper is predicted as measured; C 35 is not on the form. */
+    if (PredictPrintModel(model, 1, cmyk, spectra, NULL, Lab) != VM_STATUS_OK || spectra[0] != 0.9 ||
+        spectra[35] != 0.9 || PredictPrintModel(model, 2, cmyk, spectra, NULL, NULL) !=
+        VM_STATUS_COVERAGE_NOT_PREDICTED) {
+        fprintf(stderr, "unexpected prediction\n");
+        return 1;
+    }
+    DestroyPrintModel(model);
+    puts("C host: chart written, model fitted and predicted");
     return 0;
 }
