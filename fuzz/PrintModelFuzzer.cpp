@@ -5,7 +5,8 @@
 // else 0 and a model; a prediction gives 8 and writes nothing exactly when a
 // coverage is not finite, outside 0..100 or none of the model's levels, else
 // 0 and every requested array filled. A fitted model is kept while the next
-// input fits the same block, so the fuzzer spends its time on predictions.
+// input fits the same block. Valid offset fits (slow) always get a failing
+// allocation; the offset model's predictions share the gravure model's checks.
 // Input: 11 bytes (model, kind, first wavelength int16, values per patch int8,
 // count int16, flags, failing allocation, value scale, coverages n), then 4n
 // coverage bytes, then an int32 pool filling the block.
@@ -83,7 +84,9 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     if (rejection != 0 || (flags & kFail) != 0 || fit != keptFit) {
         DestroyPrintModel(keptModel);
         keptModel = nullptr, keptFit.clear();
-        allocated = 0, failingNth = (flags & kFail) != 0 ? 1 + nth % 50 : 0;
+        // A valid offset fit (slow: the grey fit of process 0) always gets a failing allocation.
+        const bool slowFit = rejection == 0 && model == VM_MODEL_OFFSET;
+        allocated = 0, failingNth = slowFit ? 1 + nth % count : (flags & kFail) != 0 ? 1 + nth % 50 : 0;
         const scratch::Allocator previous = scratch::setAllocator(failingCalloc);
         void* fitted = reinterpret_cast<void*>(1);
         const int status = FitPrintModel(model, (flags & kNullMeasurements) != 0 ? nullptr : block.data(), kind, first,
@@ -126,8 +129,8 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     const std::uint64_t sentinel = 0x7ff4000000dead00;
     const std::size_t n = cmyk.size() / 4;
     std::vector<std::uint64_t> out(n * 42, sentinel);
-    double* arrays[3] = {reinterpret_cast<double*>(out.data()), reinterpret_cast<double*>(&out[n * 36]),
-                         reinterpret_cast<double*>(&out[n * 39])};
+    double* const arrays[3] = {reinterpret_cast<double*>(out.data()), reinterpret_cast<double*>(out.data() + n * 36),
+                               reinterpret_cast<double*>(out.data() + n * 39)};
     const int status = PredictPrintModel(keptModel, static_cast<int>(n), cmyk.data(),
                                          (flags & kNullSpectra) ? nullptr : arrays[0],
                                          (flags & kNullXYZ) ? nullptr : arrays[1], (flags & kNullLab) ? nullptr : arrays[2]);
