@@ -1,9 +1,9 @@
 // The library's entry points and the life of a profile.
 //
 // CalculateChart turns the host's integers (reflectance x 1000) into one
-// 36-band row per patch, 380 to 730 nm, runs the calculation that the process
-// selects, and turns every exception into a status: no exception crosses the
-// C boundary.
+// 36-band row per patch, 380 to 730 nm (measurementblock, which FitPrintModel
+// shares), runs the calculation that the process selects, and turns every
+// exception into a status: no exception crosses the C boundary.
 #include "Colorimetry.h"
 #include "MathProfile.h"
 #include "MeasurementBlock.h"
