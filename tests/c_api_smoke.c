@@ -15,11 +15,9 @@ int main(int argc, char **argv)
     size_t length;
     FILE *chart;
     void *profile, *model = NULL;
-    int i, status;
-    /* A form of 46 patches: every patch 500, the paper (patch 1) 900. */
-    int form[46 * 36];
+    int i, status, form[46 * 36]; /* every patch 500, the paper (patch 1) 900 */
     const double cmyk[2 * 4] = {0, 0, 0, 0, 35, 0, 0, 0};
-    double spectra[2 * 36], Lab[2 * 3];
+    double spectra[2 * 36];
 
     if (argc != 2)
         return 2;
@@ -61,7 +59,7 @@ int main(int argc, char **argv)
         form[i] = i / 36 == 1 ? 900 : 500;
     /* The gravure model predicts the paper as measured; C 35 is not on the form. */
     status = FitPrintModel(VM_MODEL_GRAVURE, form, VM_INPUT_10NM, 380, 36, 46, &model);
-    if (status != VM_STATUS_OK || PredictPrintModel(model, 1, cmyk, spectra, NULL, Lab) != VM_STATUS_OK ||
+    if (status != VM_STATUS_OK || PredictPrintModel(model, 1, cmyk, spectra, NULL, NULL) != VM_STATUS_OK ||
         spectra[0] != 0.9 || spectra[35] != 0.9 ||
         PredictPrintModel(model, 2, cmyk, spectra, NULL, NULL) != VM_STATUS_COVERAGE_NOT_PREDICTED) {
         fprintf(stderr, "print model: fit gave %d or an unexpected prediction\n", status);

@@ -1,6 +1,6 @@
 // The print models that return values: the golden charts of processes 0 and
-// 1 predicted patch by patch, the refusals, the batch prediction against the
-// single one, and the statuses of the C entry points.
+// 1 predicted patch by patch in a batch and one by one, the refusals, and the
+// statuses of the C entry points.
 #include "ChartFile.h"
 #include "ScratchAllocation.h"
 #include "TestSupport.h"
@@ -67,7 +67,7 @@ std::string chartXYZ(Triple XYZ)
 
 } // namespace
 
-TEST(PrintModels, PredictTheProfilesGoldenChartsAtTheFormsLevels)
+TEST(PrintModels, PredictTheProfilesGoldenChartsInABatchAndOneByOne)
 {
     const struct {
         const char* what;
@@ -89,14 +89,16 @@ TEST(PrintModels, PredictTheProfilesGoldenChartsAtTheFormsLevels)
         SCOPED_TRACE(c.what);
         const Model model = c.fit();
         ASSERT_NE(model, nullptr);
-        std::vector<double> XYZ(3 * 900);
-        model->predict(900, cmyk.data(), nullptr, XYZ.data(), nullptr);
+        std::vector<double> XYZ(3 * 900), Lab(3 * 900);
+        model->predict(900, cmyk.data(), nullptr, XYZ.data(), Lab.data());
         const auto chart = lines(readFile(goldenPath(c.chart)));
         for (size_t i = 0; i < 900; ++i) {
             const auto golden = fields(chart.at(7 + i));
-            EXPECT_EQ(chartXYZ({XYZ[3 * i], XYZ[3 * i + 1], XYZ[3 * i + 2]}),
-                      golden.at(5) + '\t' + golden.at(6) + '\t' + golden.at(7))
-                << "patch " << i + 1;
+            const Triple xyz = spectrumToXYZ(model->predict({cmyk[4 * i], cmyk[4 * i + 1], cmyk[4 * i + 2],
+                                                             cmyk[4 * i + 3]})), lab = XYZToLab(xyz);
+            EXPECT_EQ(chartXYZ(xyz), golden.at(5) + '\t' + golden.at(6) + '\t' + golden.at(7)) << "patch " << i + 1;
+            EXPECT_EQ(std::memcmp(xyz.data(), &XYZ[3 * i], sizeof xyz), 0) << "batch, patch " << i + 1;
+            EXPECT_EQ(std::memcmp(lab.data(), &Lab[3 * i], sizeof lab), 0) << "batch, patch " << i + 1;
         }
     }
     // The fitted values that the golden charts were made with.
@@ -145,23 +147,6 @@ TEST(PrintModels, RefuseCoveragesTheyDoNotPredictAndWriteNothing)
     }
     EXPECT_EQ(refusal([] { MeasuredForm(std::vector<Spectrum>(45)); }),
               "a measured form holds the 46 spectra of the test form; 45 were given");
-}
-
-TEST(PrintModels, BatchGivesTheBitsOfSinglePredictionsAndTheColorimetryHelpers)
-{
-    const Model model = fitOffsetModel(formOf("offset-form.in"));
-    const std::vector<double> cmyk = chartCoverages();
-    std::vector<double> spectra(900 * 36), XYZ(900 * 3), Lab(900 * 3), LabAlone(900 * 3);
-    model->predict(900, cmyk.data(), spectra.data(), XYZ.data(), Lab.data());
-    model->predict(900, cmyk.data(), nullptr, nullptr, LabAlone.data());
-    EXPECT_EQ(std::memcmp(Lab.data(), LabAlone.data(), Lab.size() * sizeof(double)), 0);
-    for (size_t i = 0; i < 900; ++i) {
-        const Spectrum single = model->predict({cmyk[4 * i], cmyk[4 * i + 1], cmyk[4 * i + 2], cmyk[4 * i + 3]});
-        const Triple xyz = spectrumToXYZ(single), lab = XYZToLab(xyz);
-        EXPECT_EQ(std::memcmp(single.data(), &spectra[36 * i], sizeof single), 0) << "patch " << i;
-        EXPECT_EQ(std::memcmp(xyz.data(), &XYZ[3 * i], sizeof xyz), 0) << "patch " << i;
-        EXPECT_EQ(std::memcmp(lab.data(), &Lab[3 * i], sizeof lab), 0) << "patch " << i;
-    }
 }
 
 namespace {
@@ -215,14 +200,9 @@ TEST(PrintModelEntryPoints, StatusesAsDocumented)
     }
     handle = fitted;
     EXPECT_EQ(Lab[0], -1.0) << "nothing written on a refusal";
-    // What the C functions report is what the model holds.
-    int values = 0, levelCount = 0;
-    const double* levelList = nullptr;
     const char* text = nullptr;
-    ASSERT_EQ(DescribePrintModel(handle, &name, &values, &levelList, &levelCount), VM_STATUS_OK);
+    ASSERT_EQ(DescribePrintModel(handle, &name, nullptr, nullptr, nullptr), VM_STATUS_OK);
     EXPECT_STREQ(name, "gravure");
-    EXPECT_EQ(values, 2);
-    EXPECT_EQ(std::vector<double>(levelList, levelList + levelCount), static_cast<PrintModel*>(handle)->levels());
     ASSERT_EQ(GetPrintModelValue(handle, 0, &name, nullptr, nullptr, &text), VM_STATUS_OK);
     EXPECT_EQ(std::string(name) + ": " + text, "ink order: YCMK");
     DestroyPrintModel(handle);
