@@ -31,6 +31,7 @@
 // contraction into fused multiply-add. Candidates are compared in the order of
 // the straightforward loop, so ties resolve the same way.
 #include "GrayFitFastPath.h"
+#include "models/FourColourKernels.h"
 
 #include <cmath>
 #include <cstring>
@@ -213,13 +214,10 @@ GridEvaluator::GridEvaluator(MathProfile& profile) : inputs_(new Inputs), tables
     for (int g = 0; g < 2; ++g) {
         profile.setSample(40.0, 40.0, 40.0, requestedBlack[g], 0.0, 0.0, 0.0);
         // The coverages and their sums as calcOffsetSample forms them.
-        const double* channel = profile.patchSlots[MathProfile::kSlotCurrentSample].channel;
-        const double c = channel[0], m = channel[1], y = channel[2], k = channel[3];
-        const double coverage[4] = {c, m, y, k};
-        const double others[4] = {m + k + y, k + y + c, c + m + k, y + m + c};
+        const double* coverage = profile.patchSlots[MathProfile::kSlotCurrentSample].channel;
+        veltmarquist::models::otherCoverages(coverage, inputs_->others[g]);
         for (int x = 0; x < 4; ++x) {
             inputs_->coverage[g][x] = coverage[x];
-            inputs_->others[g][x] = others[x];
             const double* tint = profile.patchSlots[MathProfile::kSlotFirstTint + x].spectrum;
             for (int j = 0; j < kBands; ++j)
                 inputs_->dot[g][x][j] = profile.getDotarea(tint[j], solid[x]->spectrum[j], paper.spectrum[j]);
@@ -253,8 +251,8 @@ double GridEvaluator::exponent(int grey, int ink, int hundredths, int limit) con
 {
     // As calcOffsetSample forms it, with the factor and the limit as the fit
     // stores them in the profile (hundredths / 100.0, whole percent).
-    return MathProfile::offsetExponent(hundredths / 100.0, inputs_->others[grey][ink], inputs_->coverage[grey][ink],
-                                       limit);
+    return veltmarquist::models::offsetExponent(hundredths / 100.0, inputs_->others[grey][ink],
+                                                inputs_->coverage[grey][ink], limit);
 }
 
 bool GridEvaluator::threeColourGreyIgnoresBlack() const

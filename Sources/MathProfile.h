@@ -167,8 +167,6 @@ private:
     lab labOf(const ColorPatch& patch);
     // CIE 1976 colour difference sqrt(dL^2 + da^2 + db^2).
     static double deltaE(const lab& first, const lab& second);
-    // Exponent of one ink in the offset model: 1 - factor * sqrt(q * coverage / 100).
-    static double offsetExponent(double factor, double others, double coverage, double limit);
     // The grey fit; `straightforward` scores the coarse grid point by point.
     void fitGrayDiffFactor(double** rows, bool straightforward);
     // Score of one point (pC, pM, pY, pK, pL) of the grey fit against the

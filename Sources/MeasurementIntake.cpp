@@ -4,6 +4,8 @@
 //
 // The channel values of a stored patch always come from the form's layout
 // (`dithering`), never from the measurement; the measurement gives the spectrum.
+#include "Colorimetry.h"
+#include "FormOrientation.h"
 #include "MathProfile.h"
 
 #include <cstring>
@@ -101,30 +103,38 @@ double sortKey(const MathProfile::ColorPatch& patch)
 
 } // namespace
 
+namespace formorientation {
+
+bool readInSwappedHalves(const double* const* rows, double normFactor)
+{
+    const int probeRows[4] = {0, 24, 1, 25};
+    double Z[4];
+    for (int p = 0; p < 4; ++p) {
+        double XYZ[3];
+        colorimetry::spectrumToXYZ(rows[probeRows[p]], normFactor, XYZ);
+        Z[p] = XYZ[2];
+    }
+    return Z[1] > Z[0] && Z[3] > Z[2];
+}
+
+void exchangeHalves(double* const* rows)
+{
+    for (int i = 0; i <= 22; ++i) {
+        if (rows[i + 24] == nullptr)
+            break;
+        double scratch[MathProfile::kBands];
+        std::memcpy(scratch, rows[i], sizeof scratch);
+        std::memcpy(rows[i], rows[i + 24], sizeof scratch);
+        std::memcpy(rows[i + 24], scratch, sizeof scratch);
+    }
+}
+
+} // namespace formorientation
+
 void MathProfile::readData(double** rows)
 {
-    // Orientation check: on a correctly read form row 0 is the cyan solid and
-    // row 24 yellow + black, row 1 the paper and row 25 a 70 % magenta; both
-    // later rows are then bluer (lower Z) than the earlier ones. When both are
-    // yellower, the two halves of the form were read in swapped order.
-    ColorPatch probe[4] = {};
-    const int probeRows[4] = {0, 24, 1, 25};
-    for (int p = 0; p < 4; ++p) {
-        std::memcpy(probe[p].spectrum, rows[probeRows[p]], sizeof probe[p].spectrum);
-        spec2XYZ(&probe[p]);
-    }
-    if (probe[1].XYZ[2] > probe[0].XYZ[2] && probe[3].XYZ[2] > probe[2].XYZ[2]) {
-        // Exchange rows i and i + 24 for i = 0..22. A form of 46 rows has no
-        // row 46: only the pairs that exist are exchanged and row 22 stays.
-        for (int i = 0; i <= 22; ++i) {
-            if (rows[i + 24] == nullptr)
-                break;
-            double scratch[kBands];
-            std::memcpy(scratch, rows[i], sizeof scratch);
-            std::memcpy(rows[i], rows[i + 24], sizeof scratch);
-            std::memcpy(rows[i + 24], scratch, sizeof scratch);
-        }
-    }
+    if (formorientation::readInSwappedHalves(rows, normFactor))
+        formorientation::exchangeHalves(rows);
 
     for (int i = 0; i < 46; ++i) {
         const int destination = classify(dithering[i]);

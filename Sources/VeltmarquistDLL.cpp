@@ -1,11 +1,12 @@
 // The library's entry points and the life of a profile.
 //
 // CalculateChart turns the host's integers (reflectance x 1000) into one
-// 36-band row per patch, 380 to 730 nm, runs the calculation that the process
-// selects, and turns every exception into a status: no exception crosses the
-// C boundary.
+// 36-band row per patch, 380 to 730 nm (measurementblock, which FitPrintModel
+// shares), runs the calculation that the process selects, and turns every
+// exception into a status: no exception crosses the C boundary.
 #include "Colorimetry.h"
 #include "MathProfile.h"
+#include "MeasurementBlock.h"
 #include "ScratchAllocation.h"
 #include "VeltmarquistDLL.h"
 
@@ -35,11 +36,13 @@ MathProfile::MathProfile(const char* name)
 
 MathProfile::~MathProfile() = default;
 
-double MathProfile::InterpolateSpectralValue(int band, double* values)
+namespace {
+
+// Value of the 36-band position `band` from 16 values at 400, 420, ..., 700 nm:
+// 380-410 nm take the 420 nm value (values[0] is never used), 710-730 nm the
+// 700 nm value; odd positions in between the mean of their neighbours.
+double interpolateSixteen(int band, const double* values)
 {
-    // 16 values at 400, 420, ..., 700 nm. 380-410 nm take the 420 nm value
-    // (values[0] is never used), 710-730 nm the 700 nm value; odd positions
-    // in between the mean of their neighbours.
     if (band < 4)
         return values[1];
     if (band >= 33)
@@ -48,6 +51,13 @@ double MathProfile::InterpolateSpectralValue(int band, double* values)
     if (band % 2 == 0)
         return values[h - 1];
     return (values[h - 1] + values[h]) * 0.5;
+}
+
+} // namespace
+
+double MathProfile::InterpolateSpectralValue(int band, double* values)
+{
+    return interpolateSixteen(band, values);
 }
 
 // ---- Scratch buffers ---------------------------------------------------------
@@ -75,40 +85,12 @@ void release(void* buffer)
 }
 } // namespace scratch
 
+namespace measurementblock {
+
 namespace {
 
 const int kMaxPatches = 1999;
-const int kRowTableSize = 2000;
 const int kPatchStride = 100;
-
-// The buffers of one call, released on every path.
-struct CallBuffers {
-    double* channelMatrix = nullptr;
-    double* rows[kRowTableSize] = {};
-    double* patchMatrix = nullptr;
-
-    ~CallBuffers()
-    {
-        scratch::release(channelMatrix);
-        for (double* row : rows)
-            scratch::release(row);
-        scratch::release(patchMatrix);
-    }
-};
-
-// Patches the calculation of `process` reads.
-int patchesRead(int process)
-{
-    switch (process) {
-    case VM_PROCESS_SIX_COLOUR: return 10;
-    case VM_PROCESS_SEVEN_COLOUR: return 11;
-    case VM_PROCESS_SEPARATED_SET: return 1;
-    case VM_PROCESS_CHART_COPY:
-    case VM_PROCESS_CHART_CONVERT:
-    case VM_PROCESS_CHART_BLEND: return 2; // the two reference whites
-    default: return 46;                    // the four-colour test form
-    }
-}
 
 // Band placement of kind-10 input: d = F / 10 - 38 bands lie below 380 nm
 // (or, for F > 380, missing in front of the first measured band).
@@ -121,32 +103,6 @@ Placement placementOf(int firstWavelength, int valuesPerPatch)
 {
     const int s = std::abs(firstWavelength / 10 - 38);
     return Placement{std::min(s, 99), std::min(valuesPerPatch - s, 36)};
-}
-
-bool measurementBlockValid(const MathProfile* profile, PrintProcess process, const char* path,
-                           const int* measurements, int inputKind, int firstWavelength, int valuesPerPatch,
-                           int count)
-{
-    if (profile == nullptr || path == nullptr || measurements == nullptr)
-        return false;
-    if (count > kMaxPatches || count < patchesRead(process))
-        return false;
-    if (inputKind == VM_INPUT_16BAND) {
-        if (valuesPerPatch != 16)
-            return false;
-    } else {
-        if (valuesPerPatch < 1 || valuesPerPatch > kPatchStride)
-            return false;
-        if (firstWavelength > 380 && (firstWavelength > 740 || valuesPerPatch > 36))
-            return false;
-        if (placementOf(firstWavelength, valuesPerPatch).copied < 1)
-            return false;
-    }
-    if (process == VM_PROCESS_SEPARATED_SET)
-        for (const auto& list : profile->tintLists)
-            if (list.empty())
-                return false; // no tone ramps of a preceding process 3 or 5
-    return true;
 }
 
 // Places the bands of one converted patch (100 doubles) into its 36-band row.
@@ -171,10 +127,35 @@ void placeBands(const double* p, double* row, int firstWavelength, int valuesPer
         row[placement.offset + j] = p[j];
 }
 
-int runCalculation(MathProfile* profile, PrintProcess process, const char* path, int* measurements,
-                   int inputKind, int firstWavelength, int valuesPerPatch, int count)
+} // namespace
+
+bool blockValid(const int* measurements, const Layout& layout, int patchesRead)
 {
-    CallBuffers buffers;
+    if (measurements == nullptr)
+        return false;
+    if (layout.count > kMaxPatches || layout.count < patchesRead)
+        return false;
+    const int F = layout.firstWavelength, N = layout.valuesPerPatch;
+    if (layout.inputKind == VM_INPUT_16BAND)
+        return N == 16;
+    if (N < 1 || N > kPatchStride)
+        return false;
+    if (F > 380 && (F > 740 || N > 36))
+        return false;
+    return placementOf(F, N).copied >= 1;
+}
+
+Rows::~Rows()
+{
+    scratch::release(channelMatrix);
+    for (double* row : rows)
+        scratch::release(row);
+    scratch::release(patchMatrix);
+}
+
+int marshal(const int* measurements, const Layout& layout, Rows& buffers)
+{
+    const int count = layout.count, valuesPerPatch = layout.valuesPerPatch;
     buffers.channelMatrix = static_cast<double*>(scratch::allocate(static_cast<size_t>(count) * 7, sizeof(double)));
     if (buffers.channelMatrix == nullptr)
         return VM_STATUS_OUT_OF_MEMORY;
@@ -189,7 +170,7 @@ int runCalculation(MathProfile* profile, PrintProcess process, const char* path,
         return VM_STATUS_OUT_OF_MEMORY;
 
     // Convert to reflectance factors (0..1).
-    if (inputKind == VM_INPUT_10NM) {
+    if (layout.inputKind == VM_INPUT_10NM) {
         for (int i = 0; i < count; ++i)
             for (int j = 0; j < valuesPerPatch; ++j)
                 buffers.patchMatrix[i * kPatchStride + j] = measurements[i * valuesPerPatch + j] / 1000.0;
@@ -199,21 +180,62 @@ int runCalculation(MathProfile* profile, PrintProcess process, const char* path,
             for (int j = 0; j < valuesPerPatch; ++j)
                 sixteen[j] = measurements[i * valuesPerPatch + j] / 1000.0;
             for (int b = 0; b < MathProfile::kBands; ++b)
-                buffers.patchMatrix[i * kPatchStride + b] = profile->InterpolateSpectralValue(b, sixteen);
+                buffers.patchMatrix[i * kPatchStride + b] = interpolateSixteen(b, sixteen);
         }
     }
     // Widened 16-band patches are placed as 36 bands from 380 nm; the host's
     // channel values still stand behind its own 16-value patches.
-    const int placedFirst = inputKind == VM_INPUT_16BAND ? 380 : firstWavelength;
-    const int placedBands = inputKind == VM_INPUT_16BAND ? 36 : valuesPerPatch;
+    const int placedFirst = layout.inputKind == VM_INPUT_16BAND ? 380 : layout.firstWavelength;
+    const int placedBands = layout.inputKind == VM_INPUT_16BAND ? 36 : valuesPerPatch;
     const Placement placement = placementOf(placedFirst, placedBands);
     for (int i = 0; i < count; ++i)
         placeBands(buffers.patchMatrix + i * kPatchStride, buffers.rows[i], placedFirst, placedBands, placement);
+    return VM_STATUS_OK;
+}
 
+} // namespace measurementblock
+
+namespace {
+
+// Patches the calculation of `process` reads.
+int patchesRead(int process)
+{
+    switch (process) {
+    case VM_PROCESS_SIX_COLOUR: return 10;
+    case VM_PROCESS_SEVEN_COLOUR: return 11;
+    case VM_PROCESS_SEPARATED_SET: return 1;
+    case VM_PROCESS_CHART_COPY:
+    case VM_PROCESS_CHART_CONVERT:
+    case VM_PROCESS_CHART_BLEND: return 2; // the two reference whites
+    default: return 46;                    // the four-colour test form
+    }
+}
+
+bool measurementBlockValid(const MathProfile* profile, PrintProcess process, const char* path,
+                           const int* measurements, const measurementblock::Layout& layout)
+{
+    if (profile == nullptr || path == nullptr)
+        return false;
+    if (!measurementblock::blockValid(measurements, layout, patchesRead(process)))
+        return false;
+    if (process == VM_PROCESS_SEPARATED_SET)
+        for (const auto& list : profile->tintLists)
+            if (list.empty())
+                return false; // no tone ramps of a preceding process 3 or 5
+    return true;
+}
+
+int runCalculation(MathProfile* profile, PrintProcess process, const char* path, int* measurements,
+                   const measurementblock::Layout& layout)
+{
+    measurementblock::Rows buffers;
+    if (const int status = measurementblock::marshal(measurements, layout, buffers))
+        return status;
+    const int count = layout.count;
     if (process == VM_PROCESS_CHART_COPY || process == VM_PROCESS_CHART_CONVERT || process == VM_PROCESS_CHART_BLEND)
         for (int i = 0; i < count; ++i)
             for (int k = 0; k < 7; ++k)
-                buffers.channelMatrix[7 * i + k] = measurements[count * valuesPerPatch + 7 * i + k];
+                buffers.channelMatrix[7 * i + k] = measurements[count * layout.valuesPerPatch + 7 * i + k];
 
     switch (process) {
     case VM_PROCESS_GRAVURE:
@@ -258,12 +280,11 @@ int CalculateChart(void* profile, PrintProcess process, const char* path, int* m
     if (inputKind != VM_INPUT_10NM && inputKind != VM_INPUT_16BAND)
         return VM_STATUS_UNKNOWN_INPUT_KIND;
     MathProfile* object = static_cast<MathProfile*>(profile);
-    if (!measurementBlockValid(object, process, path, measurements, inputKind, firstWavelength, valuesPerPatch,
-                               count))
+    const measurementblock::Layout layout{inputKind, firstWavelength, valuesPerPatch, count};
+    if (!measurementBlockValid(object, process, path, measurements, layout))
         return VM_STATUS_INVALID_MEASUREMENTS;
     try {
-        return runCalculation(object, process, path, measurements, inputKind, firstWavelength, valuesPerPatch,
-                              count);
+        return runCalculation(object, process, path, measurements, layout);
     } catch (const Exceptions& failure) {
         delete object;
         return failure.code;

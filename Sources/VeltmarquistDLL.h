@@ -62,18 +62,22 @@ enum {
     VM_INPUT_16BAND = 20 /* 16 bands, 400 to 700 nm in 20 nm steps; firstWavelength unused      */
 };
 
-/* ---- Status codes returned by CalculateChart -------------------------------
+/* ---- Status codes -----------------------------------------------------------
  *
- *  code  name                            meaning                                   profile afterwards
- *  ----  ------------------------------  ----------------------------------------  ------------------
- *  0     VM_STATUS_OK                    chart written                             alive
- *  1     VM_STATUS_FILE_NOT_OPENED       chart file could not be opened            destroyed
- *  2     VM_STATUS_UNKNOWN_INPUT_KIND    inputKind is neither 10 nor 20            alive
- *  3     VM_STATUS_CALCULATION_FAILED    the calculation failed (an exception)     destroyed
- *  4     VM_STATUS_INVALID_MEASUREMENTS  invalid measurement block (see below)     alive
- *  5     VM_STATUS_OUT_OF_MEMORY         a scratch buffer could not be allocated   alive
+ *  code  name                              meaning                                   profile afterwards
+ *  ----  --------------------------------  ----------------------------------------  ------------------
+ *  0     VM_STATUS_OK                      chart written, model fitted or predicted  alive
+ *  1     VM_STATUS_FILE_NOT_OPENED         chart file could not be opened            destroyed
+ *  2     VM_STATUS_UNKNOWN_INPUT_KIND      inputKind is neither 10 nor 20            alive
+ *  3     VM_STATUS_CALCULATION_FAILED      the calculation failed (an exception)     destroyed
+ *  4     VM_STATUS_INVALID_MEASUREMENTS    invalid measurement block (see below)     alive
+ *  5     VM_STATUS_OUT_OF_MEMORY           a scratch buffer could not be allocated   alive
+ *  6     VM_STATUS_UNKNOWN_MODEL           the model selector names no model here    (print models only)
+ *  7     VM_STATUS_INVALID_ARGUMENT        a null or out-of-range argument           (print models only)
+ *  8     VM_STATUS_COVERAGE_NOT_PREDICTED  a coverage the model does not predict     (print models only)
  *
- * Status 2 is checked first, then status 4; statuses 2, 4 and 5 write no file.
+ * CalculateChart returns 0 to 5. Status 2 is checked first, then status 4;
+ * statuses 2, 4 and 5 write no file.
  * Status 4 (nothing allocated, nothing written) is returned for:
  *  - a null profile, path or measurements pointer;
  *  - count above 1999, or below what the process reads: 46 for processes 0,
@@ -85,14 +89,19 @@ enum {
  *  - kind 20 with valuesPerPatch other than 16;
  *  - process 6 on a profile that holds no tone ramps of a preceding process
  *    3 or 5 (one of its seven tint lists is empty).
- * Write errors after the file was opened are not detected (status 0).       */
+ * Write errors after the file was opened are not detected (status 0).
+ * The print-model functions never destroy a model; their statuses are stated
+ * at each of them.                                                           */
 enum {
     VM_STATUS_OK = 0,
     VM_STATUS_FILE_NOT_OPENED = 1,
     VM_STATUS_UNKNOWN_INPUT_KIND = 2,
     VM_STATUS_CALCULATION_FAILED = 3,
     VM_STATUS_INVALID_MEASUREMENTS = 4,
-    VM_STATUS_OUT_OF_MEMORY = 5
+    VM_STATUS_OUT_OF_MEMORY = 5,
+    VM_STATUS_UNKNOWN_MODEL = 6,
+    VM_STATUS_INVALID_ARGUMENT = 7,
+    VM_STATUS_COVERAGE_NOT_PREDICTED = 8
 };
 
 /* Number of ints that the measurement block of processes 3, 5 and 6 must hold:
@@ -124,6 +133,74 @@ VELTMARQUIST_API int CalculateChart(void *profile, PrintProcess process, const c
 
 /* Destroys a profile; does nothing for null.                                 */
 VELTMARQUIST_API void DestroyMathProfile(void *profile);
+
+/* ---- Print models that return values -----------------------------------------
+ *
+ * A model is fitted once to the four-colour test form and then predicts as
+ * many coverages as the host asks for, into the host's arrays:
+ *
+ *     void *model = NULL;
+ *     double cmyk[2 * 4] = {40, 40, 40, 0,  100, 0, 100, 0}, Lab[2 * 3];
+ *     int status = FitPrintModel(VM_MODEL_OFFSET, measurements, VM_INPUT_10NM,
+ *                                380, 36, 46, &model);
+ *     if (status == VM_STATUS_OK)
+ *         status = PredictPrintModel(model, 2, cmyk, NULL, NULL, Lab);
+ *     DestroyPrintModel(model);
+ *
+ * A model never changes once fitted: several threads may predict with one
+ * model at once. Models and profiles are different handles; neither may be
+ * passed where the other is expected.                                        */
+enum {
+    VM_MODEL_OFFSET = 0,         /* offset model, fitted to the greys as process 0 fits it; the form's levels  */
+    VM_MODEL_GRAVURE = 1,        /* gravure model with the defaults of process 1; the form's levels           */
+    VM_MODEL_GRAVURE_FITTED = 2, /* gravure model, ink order and factors fitted to red, green and blue       */
+    VM_MODEL_YULE_NIELSEN = 3    /* Yule-Nielsen spectral Neugebauer model; every coverage from 0 to 100 %    */
+};
+
+/* Values per predicted spectrum: 380 to 730 nm in 10 nm steps.              */
+#define VM_SPECTRUM_BANDS 36
+
+/* Fits the model `model` (VM_MODEL_*) to the test form in a measurement block
+ * laid out as for CalculateChart with process 0: the same input kinds,
+ * validation and band placement, the first 46 patches the form in measuring
+ * order, the block only read. A form read in swapped halves is exchanged
+ * back as process 0 does (with more than 46 patches that exchange also swaps
+ * patches 22 and 46). On status 0 *fitted receives the model, otherwise null.
+ * Statuses, checked in this order: 2 (input kind), 6 (a selector this library
+ * holds no model for), 7 (null `fitted`), 4 (the block, as for process 0),
+ * then 5 (a buffer could not be allocated) or 3 (the fit failed).           */
+VELTMARQUIST_API int FitPrintModel(int model, const int *measurements, int inputKind, int firstWavelength,
+                                   int valuesPerPatch, int count, void **fitted);
+
+/* Predicts `count` coverages; cmyk holds C, M, Y, K in percent for each.
+ * Writes per patch 36 reflectance values (0..1) to spectra, X, Y, Z (D50,
+ * 0..100; Y is not limited to 100) to XYZ and L*, a*, b* to Lab; any of the
+ * three may be null. None of them may overlap cmyk.
+ * Status 7 for a null model, a negative count, or a null cmyk with count
+ * above 0; status 8 when any coverage is not finite, lies outside 0..100 or
+ * is none of the model's levels: then nothing is written.                    */
+VELTMARQUIST_API int PredictPrintModel(const void *model, int count, const double *cmyk, double *spectra,
+                                       double *XYZ, double *Lab);
+
+/* The model's name ("offset", "gravure" or "Yule-Nielsen"), the number of its
+ * fitted values, and the coverage levels it predicts (the same for each ink;
+ * levelCount 0: every coverage from 0 to 100 %). Any output pointer may be
+ * null. Strings and arrays stay valid until the model is destroyed.
+ * Status 7 for a null model.                                                 */
+VELTMARQUIST_API int DescribePrintModel(const void *model, const char **name, int *valueCount,
+                                        const double **levels, int *levelCount);
+
+/* Fitted value `index` (0 to valueCount - 1), for display: its name (for
+ * example "coverage limit (%)"), its numbers (count of them, null when
+ * there are none) and its text (the gravure ink order, a warning; "" when
+ * there is none). Any output pointer may be null; what they receive stays
+ * valid until the model is destroyed. Status 7 for a null model or an index
+ * out of range.                                                              */
+VELTMARQUIST_API int GetPrintModelValue(const void *model, int index, const char **name, const double **numbers,
+                                        int *count, const char **text);
+
+/* Destroys a model; does nothing for null.                                   */
+VELTMARQUIST_API void DestroyPrintModel(void *model);
 
 #ifdef __cplusplus
 }

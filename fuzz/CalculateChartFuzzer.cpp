@@ -1,8 +1,11 @@
-// Fuzzer of CalculateChart: up to three calls on one profile, blocks exactly as
-// long as a host makes them. Aborts on a broken promise: 2 or 4, allocating and
-// writing nothing; 5 and no file for a failing allocation; 1 and nothing made
-// for an unopenable path; else 0 and a complete chart. Valid offset fits (slow)
-// always get a failing allocation.
+// Fuzzer of CalculateChart and the print-model entry points: up to three calls
+// on one profile, blocks exactly as long as a host makes them. Aborts on a
+// broken promise: 2 or 4, allocating and writing nothing; 5 and no file for a
+// failing allocation; 1 and nothing made for an unopenable path; else 0 and a
+// complete chart. Valid offset fits (slow) always get a failing allocation.
+// A call with flag 0x40 fits a print model instead (the process is the model
+// selector, the null-path flag nulls the model pointer) and predicts the
+// coverages that the pool holds behind the block: see modelCall.
 // Input: byte 0 is calls - 1 (mod 3); 11 bytes per call: process, kind, first
 // wavelength (int16), values per patch (int8), count (int16), flags, failing
 // allocation, value scale, extremes; the rest is an int32 pool filling blocks.
@@ -13,6 +16,7 @@
 
 #include <algorithm>
 #include <climits>
+#include <cmath>
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
@@ -23,7 +27,7 @@
 
 namespace {
 
-enum Flags { kNullProfile = 1, kNullPath = 2, kNullMeasurements = 4, kFailAllocation = 0x20 };
+enum Flags { kNullProfile = 1, kNullPath = 2, kNullMeasurements = 4, kFailAllocation = 0x20, kModelCall = 0x40 };
 enum PathKind { kMissingFolder = 2, kFolder = 3 }; // flag bits 3 and 4; else a new file
 const int kProcesses[16] = {1, 3, 5, 6, 7, 8, 9, 0, 2, 4, -1, 10, INT_MIN, INT_MAX, 8, 7};
 const int kKinds[8] = {10, 20, 10, 20, 15, 0, INT_MIN, INT_MAX};
@@ -83,6 +87,74 @@ std::string folder; // made once per process, in memory-backed /dev/shm when the
 int allocated = 0, failingNth = 0;
 void* failingCalloc(std::size_t n, std::size_t s) { return ++allocated == failingNth ? nullptr : std::calloc(n, s); }
 
+void promise(bool kept, const char* what, int process, int status)
+{
+    if (!kept && std::fprintf(stderr, "broken promise: %s (process %d, status %d)\n", what, process, status))
+        std::abort();
+}
+
+// An odd pool value v picks kCoverages[(v >> 1) & 15], an even one (v >> 1) % 10001 / 100.
+const double kCoverages[16] = {0, 10, 20, 40, 60, 70, 80, 90, 100, 35, -0.0, -1, 100.5, HUGE_VAL, -HUGE_VAL, NAN};
+
+// FitPrintModel on the block: the documented rejection (2, 6, 7, then 4 as for
+// process 0) allocating nothing, 5 for a failing allocation, else a model. Its
+// prediction of the coverages (at most 64 patches) refuses with 8 and writes
+// nothing exactly when one is not finite, lies outside 0..100 or is none of
+// the model's levels; otherwise it fills every array.
+void modelCall(Call call, const std::vector<int>& block, const int* coverages, std::size_t coverageInts)
+{
+    Call asForm = call;
+    asForm.process = VM_PROCESS_OFFSET, asForm.flags &= ~(kNullProfile | kNullPath);
+    const int p = call.process, layout = documentedRejection(asForm, false, true);
+    const int rejection = layout == VM_STATUS_UNKNOWN_INPUT_KIND ? layout
+                          : p < 0 || p > 3                       ? VM_STATUS_UNKNOWN_MODEL
+                          : (call.flags & kNullPath) != 0        ? VM_STATUS_INVALID_ARGUMENT
+                                                                 : layout;
+    if (rejection == 0 && p == VM_MODEL_OFFSET) // the grey fit of process 0
+        call.failingAllocation = 1 + std::max(call.failingAllocation - 1, 0) % call.count;
+    allocated = 0, failingNth = call.failingAllocation;
+    const scratch::Allocator previous = scratch::setAllocator(failingCalloc);
+    void* model = &allocated; // a fit that checks the block must leave null when it fails
+    const int status = FitPrintModel(p, (call.flags & kNullMeasurements) != 0 ? nullptr : block.data(), call.inputKind,
+                                     call.firstWavelength, call.valuesPerPatch, call.count,
+                                     (call.flags & kNullPath) != 0 ? nullptr : &model);
+    scratch::setAllocator(previous);
+    // Until the library holds the Yule-Nielsen fit, its selector names no model.
+    if (p == VM_MODEL_YULE_NIELSEN && status == VM_STATUS_UNKNOWN_MODEL && rejection != VM_STATUS_UNKNOWN_INPUT_KIND)
+        return;
+    if (rejection != 0 || (failingNth > 0 && allocated >= failingNth)) {
+        promise(rejection != 0 ? status == rejection && allocated == 0 : status == VM_STATUS_OUT_OF_MEMORY,
+                "the documented rejection of a fit allocating nothing, or 5 for a failing allocation", p, status);
+        promise(rejection != 0 && rejection != VM_STATUS_INVALID_MEASUREMENTS ? model != nullptr : model == nullptr,
+                "no model after a failed fit", p, status);
+        return;
+    }
+    const double* levels = nullptr;
+    int levelCount = -1;
+    promise(status == VM_STATUS_OK && DescribePrintModel(model, nullptr, nullptr, &levels, &levelCount) == 0,
+            "a valid block fits a model", p, status);
+    std::vector<double> cmyk(std::min<std::size_t>(coverageInts / 4, 64) * 4);
+    bool predicted = true;
+    for (std::size_t i = 0; i < cmyk.size(); ++i) {
+        const int v = coverages[i];
+        const double c = cmyk[i] = v & 1 ? kCoverages[(v >> 1) & 15] : (v >> 1) % 10001 / 100.0;
+        predicted = predicted && c >= 0.0 && c <= 100.0 &&
+                    (levelCount == 0 || std::find(levels, levels + levelCount, c) != levels + levelCount);
+    }
+    // Every output starts as a signalling NaN, which no arithmetic produces.
+    const std::size_t n = cmyk.size() / 4;
+    std::vector<std::uint64_t> out(n * 42 + 1, 0x7ff4000000dead00);
+    double* const first = reinterpret_cast<double*>(out.data());
+    const int predictedStatus =
+        PredictPrintModel(model, static_cast<int>(n), cmyk.data(), first, first + n * 36, first + n * 39);
+    DestroyPrintModel(model);
+    promise(predictedStatus == (predicted ? VM_STATUS_OK : VM_STATUS_COVERAGE_NOT_PREDICTED), "a prediction's status",
+            p, predictedStatus);
+    const auto untouched = static_cast<std::size_t>(std::count(out.begin(), out.end(), out.back()));
+    promise(untouched == 1 + (predicted ? 0 : n * 42),
+            "the requested arrays filled, or nothing written on a refusal", p, predictedStatus);
+}
+
 } // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size)
@@ -102,7 +174,8 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         const int p = call.process;
         const bool conversion = p >= 7 && p <= 9, exchange = p == 3 || p == 5 || p == 6;
         const int rejection = documentedRejection(call, conversion, hasRamps);
-        if (rejection == 0 && p != VM_PROCESS_GRAVURE && !exchange && !conversion) // the offset fit
+        // The offset fit of process 0 (slow) always gets a failing allocation.
+        if (rejection == 0 && p != VM_PROCESS_GRAVURE && !exchange && !conversion && !(call.flags & kModelCall))
             call.failingAllocation = 1 + std::max(call.failingAllocation - 1, 0) % call.count;
         // The patches, a conversion's channel values behind them, at least the exchange buffer for 3, 5 and 6.
         const long width = call.inputKind == VM_INPUT_16BAND ? 16 : std::clamp(call.valuesPerPatch, 0, 100);
@@ -111,6 +184,12 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         for (std::size_t i = 0; i < block.size() && !pool.empty(); ++i)
             block[i] = static_cast<int>(static_cast<std::uint32_t>(1LL * call.scale * pool[i % pool.size()]));
         const std::vector<int> before = block;
+        if ((call.flags & kModelCall) != 0) {
+            const std::size_t behind = std::min<std::size_t>(static_cast<std::size_t>(ints), pool.size());
+            modelCall(call, block, pool.data() + behind, pool.size() - behind);
+            promise(block == before, "a fit only reads the block", p, 0);
+            continue;
+        }
         const int pathKind = (call.flags >> 3) & 3;
         const std::string path = pathKind == kMissingFolder ? inMissingFolder : pathKind == kFolder ? folder : chart;
         unlink(chart.c_str());
@@ -121,10 +200,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
                                           (call.flags & kNullMeasurements) != 0 ? nullptr : block.data(),
                                           call.inputKind, call.firstWavelength, call.valuesPerPatch, call.count);
         scratch::setAllocator(previous);
-        auto check = [&](bool kept, const char* promise) {
-            if (!kept && std::fprintf(stderr, "broken promise: %s (process %d, status %d)\n", promise, p, status))
-                std::abort();
-        };
+        auto check = [&](bool kept, const char* what) { promise(kept, what, p, status); };
         if (rejection != 0 || (failingNth > 0 && allocated >= failingNth)) {
             check(rejection != 0 ? status == rejection && allocated == 0 : status == VM_STATUS_OUT_OF_MEMORY,
                   "the documented rejection allocating nothing, or status 5 for a failing allocation");

@@ -86,20 +86,6 @@ TEST(GrayFit, WholeHundredthsWithinBoundsRepeatableAndCloser)
     EXPECT_TRUE(std::equal(first, first + 5, second));
 }
 
-TEST(RGBFactors, GoldenFitAndChart)
-{
-    TempDir dir;
-    RowTable rows = RowTable::fromBlock(readGoldenInput("offset-form.in"));
-    MathProfile profile("gravure");
-    profile.calculateRGBFactors(rows.rows());
-    EXPECT_EQ(profile.inkOrder, 3);
-    EXPECT_EQ(profile.rgbFactor[0], 0.95);
-    EXPECT_EQ(profile.rgbFactor[1], 0.95);
-    EXPECT_EQ(profile.rgbFactor[2], 1.0);
-    profile.calculateChart(rows.rows(), VM_PROCESS_GRAVURE, dir.path("rgb.txt").c_str());
-    EXPECT_EQ(readFile(dir.path("rgb.txt")), readFile(goldenPath("offset-form.rgb-p1.chart")));
-}
-
 TEST(RGBFactors, RecoversTheOrderAndFactorsOfAGravureForm)
 {
     // Y M K C: red and green follow the first factor, blue the second; the

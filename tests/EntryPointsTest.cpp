@@ -1,5 +1,5 @@
-// The entry points: a new profile, the widening of 16-band measurements, the
-// band placement of both input kinds, and status 3 for a failing calculation.
+// The entry points: a new profile, the band placement of both input kinds
+// (16 bands widened to 36), and status 3 for a failing calculation.
 // (Every rejection and clean-up path is in the reliability suite.)
 #if defined(__GNUC__) && !defined(__clang__)
 // operator new is replaced below with malloc/free underneath; GCC cannot see
@@ -74,20 +74,6 @@ TEST(Profile, ConstructionValuesAndVersion)
     EXPECT_EQ(std::string(MathProfile(longName.c_str()).profileName), longName.substr(0, 1023));
     EXPECT_STREQ(VeltmarquistDLLVersionString, "@(#)PROGRAM:VeltmarquistDLL  PROJECT:Pellinore_AllModules-1\n");
     EXPECT_EQ(VeltmarquistDLLVersionNumber, 1.0);
-}
-
-TEST(Marshalling, SixteenBandsAreWidenedTo36)
-{
-    MathProfile profile("i");
-    double v[16];
-    for (int i = 0; i < 16; ++i)
-        v[i] = 0.1 * (i + 1) + (i % 3) * 0.013;
-    EXPECT_EQ(profile.InterpolateSpectralValue(0, v), v[1]) << "380-410 nm take the 420 nm value";
-    EXPECT_EQ(profile.InterpolateSpectralValue(3, v), v[1]);
-    EXPECT_EQ(profile.InterpolateSpectralValue(4, v), v[1]);
-    EXPECT_EQ(profile.InterpolateSpectralValue(5, v), (v[1] + v[2]) * 0.5);
-    EXPECT_EQ(profile.InterpolateSpectralValue(32, v), v[15]);
-    EXPECT_EQ(profile.InterpolateSpectralValue(35, v), v[15]);
 }
 
 TEST(Marshalling, BandPlacementOfBothKinds)

@@ -1,5 +1,6 @@
 /* A host written in C: includes the public header as C, checks the version
- * symbols and runs the chart copy (process 7) on a small block. */
+ * symbols, runs the chart copy (process 7) on a small block, and fits and
+ * predicts a print model. */
 #include "VeltmarquistDLL.h"
 
 #include <stdio.h>
@@ -13,8 +14,10 @@ int main(int argc, char **argv)
     char path[4096], text[8192];
     size_t length;
     FILE *chart;
-    void *profile;
-    int i, status;
+    void *profile, *model = NULL;
+    int i, status, form[46 * 36]; /* every patch 500, the paper (patch 1) 900 */
+    const double cmyk[2 * 4] = {0, 0, 0, 0, 35, 0, 0, 0};
+    double spectra[2 * 36];
 
     if (argc != 2)
         return 2;
@@ -52,6 +55,17 @@ int main(int argc, char **argv)
         fprintf(stderr, "unexpected chart:\n%s", text);
         return 1;
     }
-    puts("C host: chart written");
+    for (i = 0; i < 46 * 36; ++i)
+        form[i] = i / 36 == 1 ? 900 : 500;
+    /* The gravure model predicts the paper as measured; C 35 is not on the form. */
+    status = FitPrintModel(VM_MODEL_GRAVURE, form, VM_INPUT_10NM, 380, 36, 46, &model);
+    if (status != VM_STATUS_OK || PredictPrintModel(model, 1, cmyk, spectra, NULL, NULL) != VM_STATUS_OK ||
+        spectra[0] != 0.9 || spectra[35] != 0.9 ||
+        PredictPrintModel(model, 2, cmyk, spectra, NULL, NULL) != VM_STATUS_COVERAGE_NOT_PREDICTED) {
+        fprintf(stderr, "print model: fit gave %d or an unexpected prediction\n", status);
+        return 1;
+    }
+    DestroyPrintModel(model);
+    puts("C host: chart written, model fitted and predicted");
     return 0;
 }

@@ -16,7 +16,8 @@ trap 'rm -rf "$prefix"' EXIT
 cmake --install "$build" --prefix "$prefix" >/dev/null
 library=$(find "$prefix" -name 'libVeltmarquistDLL.so' | head -n 1)
 [ -n "$library" ] || { echo "install: no libVeltmarquistDLL.so under $prefix"; exit 1; }
-for file in include/veltmarquist/VeltmarquistDLL.h include/veltmarquist/MathProfile.h bin/veltmarquist \
+for file in include/veltmarquist/VeltmarquistDLL.h include/veltmarquist/MathProfile.h \
+            include/veltmarquist/PrintModels.h bin/veltmarquist \
             share/veltmarquist/samples/offset_form.txt; do
   [ -e "$prefix/$file" ] || { echo "install: $file missing"; exit 1; }
 done
@@ -33,6 +34,26 @@ cc -std=c99 -Wall -Wextra -Werror examples/c-host/main.c -o "$prefix/c-host-pkg"
   $(PKG_CONFIG_PATH="$pc" pkg-config --cflags --libs VeltmarquistDLL) -lm -Wl,-rpath,"$libdir"
 "$prefix/c-host-pkg" samples/offset_form.txt "$prefix/c-host-pkg.chart"
 
+# A C++ host of the installed print-model header: a flat form (paper 0.9, every
+# other patch 0.5) gives back its paper for 0 %.
+cat >"$prefix/models.cpp" <<'CPP'
+#include <PrintModels.h>
+#include <cstdio>
+int main()
+{
+    std::vector<veltmarquist::Spectrum> spectra(46);
+    for (size_t p = 0; p < spectra.size(); ++p)
+        spectra[p].fill(p == 1 ? 0.9 : 0.5);
+    const auto model = veltmarquist::fitGravureModel(veltmarquist::MeasuredForm(spectra),
+                                                     veltmarquist::GravureFactors::defaults);
+    return model->predict({0, 0, 0, 0})[20] == 0.9 && model->levels().size() == 9 ? 0 : 1;
+}
+CPP
+# shellcheck disable=SC2046
+c++ -std=c++17 -Wall -Wextra -Werror "$prefix/models.cpp" -o "$prefix/models" \
+  $(PKG_CONFIG_PATH="$pc" pkg-config --cflags --libs VeltmarquistDLL) -Wl,-rpath,"$libdir"
+"$prefix/models" || { echo "install: the C++ print-model host failed"; exit 1; }
+
 python3 examples/python-host/python_host.py --library "$library" samples/offset_form.txt "$prefix/python-host.chart"
 "$prefix/bin/veltmarquist" chart "$prefix/share/veltmarquist/samples/offset_form.txt" -o "$prefix/tool.chart" >/dev/null
 
@@ -40,4 +61,4 @@ for chart in c-host-pkg python-host tool; do
   cmp "$prefix/c-host.chart" "$prefix/$chart.chart" || { echo "install: the $chart chart differs"; exit 1; }
 done
 [ "$(grep -c . "$prefix/c-host.chart")" -eq 908 ] || { echo "install: the chart is not 900 patches"; exit 1; }
-echo "install-examples: 3 passed, 0 failed"
+echo "install-examples: 4 passed, 0 failed"

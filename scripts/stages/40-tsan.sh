@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
-# Two profiles in two threads at once under ThreadSanitizer: a clang build of
-# the library and the reliability tests, of which only the threads test runs.
+# Two profiles and two print models in two threads at once under
+# ThreadSanitizer: a clang build of the library and the reliability tests, of
+# which only the threads tests run.
 set -euo pipefail
 cd "$(dirname "$0")/../.."
 
@@ -13,4 +14,4 @@ cmake -S . -B "$build" -G Ninja -DCMAKE_BUILD_TYPE=RelWithDebInfo \
 cmake --build "$build" -j2 --target VeltmarquistReliabilityTests
 
 TSAN_OPTIONS="halt_on_error=1 second_deadlock_stack=1" \
-  "$build/tests/reliability/VeltmarquistReliabilityTests" --gtest_filter="TwoProfiles.*"
+  "$build/tests/reliability/VeltmarquistReliabilityTests" --gtest_filter="TwoProfiles.*:TwoModels.*"

@@ -1,5 +1,6 @@
 // Hostile calls through CalculateChart, faults the fuzzer found, allocation
-// failure, two profiles in two threads (ThreadSanitizer: scripts/stages/40-tsan.sh).
+// failure, two profiles and two print models in two threads (ThreadSanitizer:
+// scripts/stages/40-tsan.sh).
 #include "ScratchAllocation.h"
 #include "TestSupport.h"
 
@@ -302,6 +303,37 @@ TEST(TwoProfiles, TwoThreadsAtOnceWriteTheSameBytesAsOneAfterTheOther)
     one.join(), two.join();
     EXPECT_EQ(alone[0].size() + alone[1].size(), 8u) << "a call failed";
     EXPECT_TRUE(concurrent[0] == alone[0] && concurrent[1] == alone[1]);
+}
+
+// Two print models fitted and used in two threads at once give the bytes they
+// give one after the other, while a third model serves both threads.
+TEST(TwoModels, TwoThreadsAtOnceGiveTheSameBytesAsOneAfterTheOther)
+{
+    MeasurementBlock block = readGoldenInput("offset-form.in");
+    std::vector<double> cmyk;
+    for (const auto& entry : MathProfile::toBeCalculated)
+        cmyk.insert(cmyk.end(), entry.begin(), entry.end());
+    void* shared = nullptr;
+    ASSERT_EQ(FitPrintModel(VM_MODEL_GRAVURE, block.ints.data(), 10, 380, 36, 46, &shared), VM_STATUS_OK);
+    auto run = [&](int selector) { // spectra of its own model, then of the shared one; -1 where a call failed
+        void* model = nullptr;
+        std::vector<double> spectra(900 * 72, -1.0);
+        FitPrintModel(selector, block.ints.data(), 10, 380, 36, 46, &model);
+        PredictPrintModel(model, 900, cmyk.data(), spectra.data(), nullptr, nullptr);
+        PredictPrintModel(shared, 900, cmyk.data(), spectra.data() + 900 * 36, nullptr, nullptr);
+        DestroyPrintModel(model);
+        return spectra;
+    };
+    const int selectors[2] = {VM_MODEL_OFFSET, VM_MODEL_GRAVURE_FITTED};
+    const std::vector<double> alone[2] = {run(selectors[0]), run(selectors[1])};
+    std::vector<double> concurrent[2];
+    std::thread one([&] { concurrent[0] = run(selectors[0]); }), two([&] { concurrent[1] = run(selectors[1]); });
+    one.join(), two.join();
+    DestroyPrintModel(shared);
+    for (int t = 0; t < 2; ++t) {
+        EXPECT_EQ(std::count(alone[t].begin(), alone[t].end(), -1.0), 0) << "a call failed";
+        EXPECT_TRUE(concurrent[t] == alone[t]) << "thread " << t;
+    }
 }
 
 } // namespace

@@ -1,0 +1,143 @@
+// What every print model shares: the measured form, the check of the
+// requested coverages, the batch prediction and the colorimetry of its results.
+#include "PrintModels.h"
+
+#include "Colorimetry.h"
+#include "FormOrientation.h"
+#include "MathProfile.h"
+
+#include <algorithm>
+#include <charconv>
+#include <cmath>
+#include <stdexcept>
+
+namespace veltmarquist {
+
+namespace {
+
+const char kInkLetters[4] = {'C', 'M', 'Y', 'K'};
+
+// The shortest text that reads back as the same double; independent of the C locale.
+std::string number(double value)
+{
+    char text[32];
+    const auto written = std::to_chars(text, text + sizeof text, value);
+    return std::string(text, written.ptr);
+}
+
+double normFactor()
+{
+    static const double factor = colorimetry::defaultNormFactor();
+    return factor;
+}
+
+} // namespace
+
+Triple spectrumToXYZ(const Spectrum& spectrum)
+{
+    Triple XYZ;
+    colorimetry::spectrumToXYZ(spectrum.data(), normFactor(), XYZ.data());
+    return XYZ;
+}
+
+Triple XYZToLab(const Triple& XYZ)
+{
+    Triple Lab;
+    colorimetry::XYZToLab(XYZ[0] / 100.0, XYZ[1] / 100.0, XYZ[2] / 100.0, Lab.data());
+    return Lab;
+}
+
+// ---- Measured form --------------------------------------------------------------
+
+MeasuredForm::MeasuredForm(const std::vector<Spectrum>& spectra)
+{
+    if (spectra.size() != kPatches)
+        throw std::invalid_argument("a measured form holds the 46 spectra of the test form; " +
+                                    std::to_string(spectra.size()) + " were given");
+    double* rows[kPatches + 1] = {}; // the null row ends the form for the exchange
+    for (int p = 0; p < kPatches; ++p) {
+        const Spectrum& spectrum = spectra[static_cast<std::size_t>(p)];
+        for (int b = 0; b < kSpectrumBands; ++b)
+            if (!std::isfinite(spectrum[static_cast<std::size_t>(b)]))
+                throw std::invalid_argument("form patch " + std::to_string(p) + " at " + std::to_string(380 + 10 * b) +
+                                            " nm: reflectance " + number(spectrum[static_cast<std::size_t>(b)]) +
+                                            " is not a finite number");
+        spectra_[static_cast<std::size_t>(p)] = spectrum;
+        rows[p] = spectra_[static_cast<std::size_t>(p)].data();
+    }
+    halvesExchanged_ = formorientation::readInSwappedHalves(rows, normFactor());
+    if (halvesExchanged_)
+        formorientation::exchangeHalves(rows);
+}
+
+Cmyk MeasuredForm::coverageOf(int patch)
+{
+    if (patch < 0 || patch >= kPatches)
+        throw std::out_of_range("the test form has patches 0 to 45, not " + std::to_string(patch));
+    const unsigned char* cmyk = MathProfile::dithering[patch];
+    return Cmyk{double(cmyk[0]), double(cmyk[1]), double(cmyk[2]), double(cmyk[3])};
+}
+
+// ---- Print model ------------------------------------------------------------------
+
+PrintModel::PrintModel(std::string name, std::vector<FittedValue> values, std::vector<double> levels)
+    : name_(std::move(name)), values_(std::move(values)), levels_(std::move(levels))
+{
+}
+
+PrintModel::~PrintModel() = default;
+
+std::string PrintModel::refusal(const double* cmyk) const
+{
+    for (int ink = 0; ink < 4; ++ink) {
+        const double c = cmyk[ink];
+        const std::string named = std::string(1, kInkLetters[ink]) + " " + number(c);
+        // The negated test also refuses NaN.
+        if (!(c >= 0.0 && c <= 100.0))
+            return named + " is not a coverage from 0 to 100 %";
+        if (!levels_.empty() && std::find(levels_.begin(), levels_.end(), c) == levels_.end()) {
+            std::string listed;
+            for (double level : levels_)
+                listed += (listed.empty() ? "" : ", ") + number(level);
+            return "the " + name_ + " model predicts only the form's levels " + listed + " %; " + named +
+                   " is not one";
+        }
+    }
+    return std::string();
+}
+
+Spectrum PrintModel::predict(const Cmyk& cmyk) const
+{
+    const std::string refused = refusal(cmyk.data());
+    if (!refused.empty())
+        throw std::invalid_argument(refused);
+    Spectrum spectrum;
+    predictAccepted(cmyk.data(), spectrum.data());
+    return spectrum;
+}
+
+void PrintModel::predict(std::size_t count, const double* cmyk, double* spectra, double* XYZ, double* Lab) const
+{
+    for (std::size_t i = 0; i < count; ++i) {
+        const std::string refused = refusal(cmyk + 4 * i);
+        if (!refused.empty())
+            throw std::invalid_argument("patch " + std::to_string(i) + ": " + refused);
+    }
+    for (std::size_t i = 0; i < count; ++i) {
+        Spectrum spectrum;
+        predictAccepted(cmyk + 4 * i, spectrum.data());
+        if (spectra != nullptr)
+            std::copy(spectrum.begin(), spectrum.end(), spectra + kSpectrumBands * i);
+        if (XYZ == nullptr && Lab == nullptr)
+            continue;
+        const Triple xyz = spectrumToXYZ(spectrum);
+        if (XYZ != nullptr)
+            std::copy(xyz.begin(), xyz.end(), XYZ + 3 * i);
+        if (Lab != nullptr) {
+            const Triple lab = XYZToLab(xyz);
+            std::copy(lab.begin(), lab.end(), Lab + 3 * i);
+        }
+    }
+}
+
+} // namespace veltmarquist

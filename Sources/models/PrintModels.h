@@ -1,0 +1,132 @@
+// Print models that return values, for C++ hosts.
+//
+// Fit a four-colour model to a measured test form once, then predict as many
+// patches as needed, from as many threads as needed:
+//
+//     veltmarquist::MeasuredForm form(spectra);        // the 46 patches in measuring order
+//     std::unique_ptr<veltmarquist::PrintModel> model = veltmarquist::fitOffsetModel(form);
+//     veltmarquist::Spectrum grey = model->predict({40, 40, 40, 0});
+//     veltmarquist::Triple Lab = veltmarquist::XYZToLab(veltmarquist::spectrumToXYZ(grey));
+//
+// The offset and gravure models give exactly the numbers of the profile's
+// methods (and so of the charts of processes 0 and 1), and like them predict
+// only the coverage levels printed on the form; the Yule-Nielsen model
+// predicts every coverage from 0 to 100 %. C hosts reach the same models
+// through FitPrintModel and PredictPrintModel in VeltmarquistDLL.h.
+#ifndef VELTMARQUIST_PRINTMODELS_H
+#define VELTMARQUIST_PRINTMODELS_H
+
+#include "VeltmarquistDLL.h"
+
+#include <array>
+#include <cstddef>
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace veltmarquist {
+
+constexpr int kSpectrumBands = 36;
+using Spectrum = std::array<double, kSpectrumBands>; // band b at 380 + 10 b nm, reflectance factor 0..1
+using Cmyk = std::array<double, 4>;                  // C, M, Y, K coverage in percent
+using Triple = std::array<double, 3>;                // X, Y, Z or L*, a*, b*
+
+// X, Y, Z (D50, 2 degree, 0..100) of a spectrum, as the library sums them. Y
+// is not limited to 100 (the chart files limit it when they write it).
+VELTMARQUIST_API Triple spectrumToXYZ(const Spectrum& spectrum);
+// CIELAB of X, Y, Z on the 0..100 scale, with the ICC D50 white and the
+// library's tabulated cube root, as the grey and gravure fits compute it.
+VELTMARQUIST_API Triple XYZToLab(const Triple& XYZ);
+
+// The measured four-colour test form as a value.
+//
+// It applies the library's orientation check: when the two halves of the
+// form were read in swapped order (rows 24 and 25 yellower than rows 0 and 1),
+// rows i and i + 24 are exchanged for i = 0..21, exactly as process 0 does
+// with a form of 46 patches. Every model is fitted to the rows after that check.
+class VELTMARQUIST_API MeasuredForm {
+public:
+    static constexpr int kPatches = 46;
+
+    // The 46 spectra of the test form in measuring order (the order of
+    // coverageOf), repeats averaged by the caller. Throws
+    // std::invalid_argument for another number of spectra or a value that is
+    // not finite.
+    explicit MeasuredForm(const std::vector<Spectrum>& spectra);
+
+    // C, M, Y, K of a patch of the form in measuring order (0..45).
+    static Cmyk coverageOf(int patch);
+    // A patch's spectrum after the orientation check.
+    const Spectrum& spectrum(int patch) const { return spectra_.at(static_cast<std::size_t>(patch)); }
+    // True when the orientation check exchanged the halves.
+    bool halvesExchanged() const { return halvesExchanged_; }
+
+private:
+    std::array<Spectrum, kPatches> spectra_;
+    bool halvesExchanged_ = false;
+};
+
+// One fitted value of a model, for display.
+struct FittedValue {
+    std::string name;            // for example "gray difference factor (C, M, Y, K)"
+    std::vector<double> numbers; // empty when the value is text alone
+    std::string text;            // for example the ink order "YMKC"; empty when there is none
+};
+
+// A fitted four-colour print model. Immutable once made: every member is
+// const and safe to call from several threads at once.
+class VELTMARQUIST_API PrintModel {
+public:
+    virtual ~PrintModel();
+    PrintModel(const PrintModel&) = delete;
+    PrintModel& operator=(const PrintModel&) = delete;
+
+    // "offset", "gravure" or "Yule-Nielsen".
+    const std::string& name() const { return name_; }
+    const std::vector<FittedValue>& fittedValues() const { return values_; }
+    // The coverages, the same for each ink, that the model predicts; empty
+    // when it predicts every coverage from 0 to 100 %.
+    const std::vector<double>& levels() const { return levels_; }
+
+    // The spectrum of one coverage. Throws std::invalid_argument, naming the
+    // ink and the value, for a coverage that is not finite, lies outside
+    // 0..100 % or is none of the model's levels.
+    Spectrum predict(const Cmyk& cmyk) const;
+    // `count` coverages (cmyk: 4 values each) into the caller's arrays:
+    // spectra 36 values, XYZ and Lab 3 values per patch; any of the three may
+    // be null. Every coverage is checked before anything is written: a
+    // refusal (std::invalid_argument, naming the patch, counted from 0)
+    // leaves the arrays untouched. The arrays must not overlap `cmyk`.
+    void predict(std::size_t count, const double* cmyk, double* spectra, double* XYZ, double* Lab) const;
+
+protected:
+    PrintModel(std::string name, std::vector<FittedValue> values, std::vector<double> levels);
+
+private:
+    // Why the model refuses a coverage, or an empty text when it predicts it.
+    std::string refusal(const double* cmyk) const;
+    // The spectrum of a coverage that refusal accepted.
+    virtual void predictAccepted(const double* cmyk, double* spectrum) const = 0;
+
+    std::string name_;
+    std::vector<FittedValue> values_;
+    std::vector<double> levels_;
+};
+
+// The offset model, its gray difference factors and coverage limit fitted to
+// the form's two greys exactly as process 0 fits them.
+VELTMARQUIST_API std::unique_ptr<PrintModel> fitOffsetModel(const MeasuredForm& form);
+
+// The gravure model with the library's default ink order and trapping factors
+// (those of process 1 on a new profile), or with both fitted to the red,
+// green and blue solids as MathProfile::calculateRGBFactors fits them.
+enum class GravureFactors { defaults, fittedToRedGreenBlue };
+VELTMARQUIST_API std::unique_ptr<PrintModel> fitGravureModel(const MeasuredForm& form, GravureFactors factors);
+
+// The Yule-Nielsen spectral Neugebauer model (n per band, dot-area curves,
+// ink spreading) fitted to all 46 patches; it predicts every coverage.
+VELTMARQUIST_API std::unique_ptr<PrintModel> fitYuleNielsenModel(const MeasuredForm& form);
+
+} // namespace veltmarquist
+
+#endif // VELTMARQUIST_PRINTMODELS_H
