@@ -10,7 +10,7 @@
  * Y, K values. */
 #include <VeltmarquistDLL.h>
 
-#include <math.h>
+#include <ctype.h>
 #include <stdio.h>
 #include <stdlib.h>
 #include <string.h>
@@ -18,6 +18,28 @@
 #define PATCHES 46
 #define BANDS 36
 #define LEADING_FIELDS 6 /* SAMPLE_ID, SAMPLE_NAME, CMYK_C, CMYK_M, CMYK_Y, CMYK_K */
+
+/* Reflectance x 1000 of a decimal text such as "0.1235", rounded half away
+ * from zero on the digits as written: converting through a double first
+ * would round 0.1235 (stored as 0.12349999...) down to 123. */
+static int thousandths(const char *text)
+{
+    int sign = 1, value = 0, digits = 0;
+    if (*text == '-' || *text == '+')
+        sign = *text++ == '-' ? -1 : 1;
+    for (; isdigit((unsigned char)*text); ++text)
+        value = value * 10 + (*text - '0');
+    if (*text == '.')
+        for (++text; isdigit((unsigned char)*text); ++text, ++digits) {
+            if (digits < 3)
+                value = value * 10 + (*text - '0');
+            else if (digits == 3 && *text >= '5')
+                ++value; /* half or more of the last thousandth */
+        }
+    for (; digits < 3; ++digits)
+        value *= 10;
+    return sign * value;
+}
 
 /* Reads the data rows into measurements (reflectance x 1000); returns the
  * number of rows read. */
@@ -38,7 +60,7 @@ static int readForm(const char *path, int *measurements)
         while ((field = strtok(rest, "\t\r\n")) != NULL && column < LEADING_FIELDS + BANDS) {
             rest = NULL;
             if (column >= LEADING_FIELDS)
-                measurements[rows * BANDS + column - LEADING_FIELDS] = (int)floor(atof(field) * 1000.0 + 0.5);
+                measurements[rows * BANDS + column - LEADING_FIELDS] = thousandths(field);
             ++column;
         }
         if (column == LEADING_FIELDS + BANDS)

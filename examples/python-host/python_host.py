@@ -15,7 +15,7 @@ values.
 import argparse
 import ctypes
 import ctypes.util
-import math
+from decimal import ROUND_HALF_UP, Decimal
 import sys
 
 PATCHES, BANDS, LEADING_FIELDS = 46, 36, 6
@@ -35,6 +35,12 @@ def load_library(path):
     return library
 
 
+def thousandths(text):
+    """Reflectance x 1000 of a decimal text, rounded half away from zero on the
+    digits as written (float("0.1235") * 1000 would round down to 123)."""
+    return int(Decimal(text).scaleb(3).quantize(Decimal(1), rounding=ROUND_HALF_UP))
+
+
 def read_form(path):
     """Reflectance x 1000 of the 46 patches, patch after patch."""
     values, in_data = [], False
@@ -46,7 +52,7 @@ def read_form(path):
             elif fields[0] == "END_DATA":
                 break
             elif in_data and len(fields) >= LEADING_FIELDS + BANDS:
-                values += [math.floor(float(v) * 1000.0 + 0.5) for v in fields[LEADING_FIELDS:LEADING_FIELDS + BANDS]]
+                values += [thousandths(v) for v in fields[LEADING_FIELDS:LEADING_FIELDS + BANDS]]
     if len(values) != PATCHES * BANDS:
         sys.exit("%s: expected %d patches of %d bands in measuring order" % (path, PATCHES, BANDS))
     return values
