@@ -47,12 +47,14 @@ void runChart(const ChartOptions& options, ChartResult& result)
     PendingOutput output(options.output);
     FittedModel fit = fitChosenModel(form, options.process, options.fitGravure, options.yuleNielsen);
     const std::vector<Cmyk> chart = characterisationChart();
+    std::vector<Triple> predicted = predictXYZ(*fit.model, chart);
     if (options.yuleNielsen)
-        output.write(xyzChartText(chart, predictXYZ(*fit.model, chart)));
+        output.write(xyzChartText(chart, predicted));
     else
         writeLibraryChart(options, form, output);
     result.fit = std::move(fit);
-    result.patches = chart.size();
+    result.coverages = chart;
+    result.predicted = std::move(predicted);
 
     // A model that predicts every coverage is checked on every combination
     // the file measured; the library's models on the chart's combinations.

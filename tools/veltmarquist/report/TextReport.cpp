@@ -142,29 +142,34 @@ void printCheck(const ChartResult& result, std::ostream& out)
             printSummary("  " + std::to_string(result.chartCheckSummary.deltaE2000.count) + " of them on the chart:",
                          result.chartCheckSummary.deltaE2000, out);
         static const char* const blacks[] = {"K 0", "K 1-40", "K 41-85", "K 86-100"};
-        out << "  mean by black:";
+        std::string means;
         for (size_t range = 0; range < 4; ++range)
             if (all.byBlack[range].count > 0)
-                out << (range == 0 ? " " : ", ") << blacks[range] << " " << fixed(all.byBlack[range].mean) << " ("
-                    << all.byBlack[range].count << ")";
-        out << "\n";
+                means += (means.empty() ? "" : ", ") + std::string(blacks[range]) + " " +
+                         fixed(all.byBlack[range].mean) + " (" + std::to_string(all.byBlack[range].count) + ")";
+        out << "  means by black (combinations): " << means << "\n";
     }
     out << "  largest difference at " << describeCmyk(result.check[all.largest].device) << "\n";
+}
+
+// The form and the model, as far as they came; true when the model came.
+bool printFormAndModel(const FormAndModel& result, std::ostream& out)
+{
+    printWarnings(result.formWarnings);
+    if (result.form)
+        printForm(*result.form, out);
+    if (result.fit)
+        printModel(*result.fit, result.form->path, out);
+    return result.fit.has_value();
 }
 
 } // namespace
 
 void renderChart(const ChartResult& result, std::ostream& out)
 {
-    printWarnings(result.formWarnings);
-    if (result.form)
-        printForm(*result.form, out);
-    if (!result.fit)
+    if (!printFormAndModel(result, out) || result.written.empty())
         return;
-    printModel(*result.fit, result.form->path, out);
-    if (result.written.empty())
-        return;
-    out << "chart: " << result.patches << " patches ("
+    out << "chart: " << result.coverages.size() << " patches ("
         << (result.fit->yuleNielsen ? "Yule-Nielsen" : result.fit->name()) << " model) written to " << result.written
         << "\n";
     printCheck(result, out);
@@ -172,13 +177,7 @@ void renderChart(const ChartResult& result, std::ostream& out)
 
 void renderCompare(const CompareResult& result, std::ostream& out)
 {
-    printWarnings(result.formWarnings);
-    if (result.form)
-        printForm(*result.form, out);
-    if (!result.fit)
-        return;
-    printModel(*result.fit, result.form->path, out);
-    if (result.modelWritten.empty())
+    if (!printFormAndModel(result, out) || result.modelWritten.empty())
         return;
     out << "measured 46-step chart written to " << result.measuredWritten << "\n"
         << "modelled 46-step chart (" << result.fit->name() << ") written to " << result.modelWritten << "\n"

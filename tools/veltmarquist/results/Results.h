@@ -40,13 +40,18 @@ struct FittedModel {
     const char* name() const { return yuleNielsen ? "ynsn" : process == VM_PROCESS_GRAVURE ? "gravure" : "offset"; }
 };
 
-// chart FORM -o CHART
-struct ChartResult {
+// What chart and compare begin with: the form found, the model fitted.
+struct FormAndModel {
     FileWarnings formWarnings;
     std::optional<FoundForm> form;
     std::optional<FittedModel> fit;
+};
+
+// chart FORM -o CHART
+struct ChartResult : FormAndModel {
+    std::vector<Cmyk> coverages;      // the chart's patches
+    std::vector<Triple> predicted;    // their X, Y, Z as the model gives them (the chart limits and cuts them)
     std::string written;              // how messages name the delivered chart; empty until delivered
-    size_t patches = 0;               // patches of the chart
     // The combinations FORM measured beyond the test form against the
     // model: the chart's combinations in chart order, then (for a model that
     // predicts every coverage) all others in file order.
@@ -56,10 +61,7 @@ struct ChartResult {
 };
 
 // compare FORM
-struct CompareResult {
-    FileWarnings formWarnings;
-    std::optional<FoundForm> form;
-    std::optional<FittedModel> fit;
+struct CompareResult : FormAndModel {
     std::string measuredWritten, modelWritten; // empty until delivered
     std::vector<CheckedPatch> patches;         // the 46 patches, X, Y, Z as their charts hold them
     Summary deltaEab, deltaE2000;
