@@ -157,15 +157,17 @@ void runMultiChannel(const MultiChannelOptions& options, MultiChannelResult& res
         profile.calculate(VM_PROCESS_SEPARATED_SET, *separated, block);
     }
 
-    chart.commit();
-    if (combinations)
-        combinations->commit();
-    if (separated)
-        separated->commit();
-    result.chartWritten = chart.name();
-    result.combinationsWritten = combinations ? combinations->name() : "";
-    result.separatedWritten = separated ? separated->name() : "";
     result.separationsPath = options.separations;
+    chart.commit();
+    result.chartWritten = chart.name();
+    if (combinations) {
+        combinations->commit();
+        result.combinationsWritten = combinations->name();
+    }
+    if (separated) {
+        separated->commit();
+        result.separatedWritten = separated->name();
+    }
 }
 
 } // namespace veltmarquist

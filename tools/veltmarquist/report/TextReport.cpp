@@ -4,6 +4,7 @@
 #include "Messages.h"
 
 #include <algorithm>
+#include <cctype>
 #include <cstdio>
 #include <string>
 
