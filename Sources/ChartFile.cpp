@@ -8,8 +8,12 @@
 // same text as printf's %g with six significant digits.
 #include "ChartFile.h"
 
+#include "models/PrintModels.h"
+
 #include <cmath>
 #include <locale>
+#include <sstream>
+#include <stdexcept>
 
 namespace chartfile {
 
@@ -21,7 +25,7 @@ void open(std::ofstream& stream, const char* path)
     stream.imbue(std::locale::classic());
 }
 
-void writeXYZHeader(std::ofstream& stream, int sets)
+void writeXYZHeader(std::ostream& stream, int sets)
 {
     stream << "IT8\r\nNUMBER_OF_SETS\t" << sets << std::endl;
     stream << "NUMBER_OF_FIELDS\t" << 8 << std::endl;
@@ -46,7 +50,7 @@ double cut(double value)
     return std::floor(value * 100.0) / 100.0;
 }
 
-void writeXYZLine(std::ofstream& stream, int number, const double channel[4], const double XYZ[3])
+void writeXYZLine(std::ostream& stream, int number, const double channel[4], const double XYZ[3])
 {
     stream << number << '\t' << channel[0] << '\t' << channel[1] << '\t' << channel[2] << '\t' << channel[3]
            << '\t' << cut(XYZ[0]) << '\t' << cut(XYZ[1]) << '\t' << cut(XYZ[2]) << std::endl;
@@ -59,3 +63,38 @@ void finish(std::ofstream& stream)
 }
 
 } // namespace chartfile
+
+// ---- The same conventions for hosts that hold values -----------------------------------
+
+namespace veltmarquist {
+
+Triple limitToChartY(const Triple& XYZ)
+{
+    Triple limited = XYZ;
+    chartfile::limitY(limited.data());
+    return limited;
+}
+
+Triple chartXYZ(const Triple& XYZ)
+{
+    const Triple limited = limitToChartY(XYZ);
+    return Triple{chartfile::cut(limited[0]), chartfile::cut(limited[1]), chartfile::cut(limited[2])};
+}
+
+std::string xyzChartText(const std::vector<Cmyk>& coverages, const std::vector<Triple>& XYZ)
+{
+    if (coverages.size() != XYZ.size())
+        throw std::invalid_argument("an XYZ chart needs one X, Y, Z per coverage: " + std::to_string(coverages.size()) +
+                                    " coverages, " + std::to_string(XYZ.size()) + " X, Y, Z");
+    std::ostringstream stream;
+    stream.imbue(std::locale::classic());
+    chartfile::writeXYZHeader(stream, static_cast<int>(coverages.size()));
+    for (size_t i = 0; i < coverages.size(); ++i) {
+        Triple limited = limitToChartY(XYZ[i]);
+        chartfile::writeXYZLine(stream, static_cast<int>(i) + 1, coverages[i].data(), limited.data());
+    }
+    stream << "END_DATA" << std::endl;
+    return stream.str();
+}
+
+} // namespace veltmarquist

@@ -6,6 +6,7 @@
 #include "MathProfile.h"
 
 #include <fstream>
+#include <ostream>
 
 namespace chartfile {
 
@@ -16,7 +17,7 @@ void open(std::ofstream& stream, const char* path);
 
 // Header of the XYZ chart layout: "IT8" CR LF, the set count, 8 fields, the
 // field names, up to "BEGIN_DATA".
-void writeXYZHeader(std::ofstream& stream, int sets);
+void writeXYZHeader(std::ostream& stream, int sets);
 
 // Limits Y to 100: when Y > 100, X and Z are scaled by 100 / Y (old Y,
 // multiplied before dividing) and Y becomes 100. NaN is left alone.
@@ -27,7 +28,7 @@ double cut(double value);
 
 // Data line of the XYZ layout: number, C, M, Y, K, then the cut X, Y, Z,
 // separated by TAB, no TAB at the end.
-void writeXYZLine(std::ofstream& stream, int number, const double channel[4], const double XYZ[3]);
+void writeXYZLine(std::ostream& stream, int number, const double channel[4], const double XYZ[3]);
 
 // "END_DATA" and close; a failing close is not reported.
 void finish(std::ofstream& stream);

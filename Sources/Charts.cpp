@@ -7,6 +7,7 @@
 // from one paper white to another.
 #include "ChartFile.h"
 #include "MathProfile.h"
+#include "models/PrintModels.h"
 
 #include <cmath>
 #include <cstring>
@@ -159,16 +160,27 @@ void MathProfile::calculateChart46(double** rows, PrintProcess process, const ch
     chartfile::finish(stream);
 }
 
-// Blend weight of process 9 from the CIELAB distance of the two whites:
+namespace veltmarquist {
+
 // 0.33 up to dE 11, then 0.33 / ((dE - 10) / 25). The jump to 8.25 just above
 // 11 and the negative measured share (1 - w) that follows are long-standing
 // behaviour that existing converted charts depend on.
-static double blendWeight(double deltaE)
+double chartConversionBlendWeight(double deltaE)
 {
     if (deltaE <= 11.0)
         return 0.33;
     return 0.33 / ((deltaE - 10.0) / 25.0);
 }
+
+std::vector<Cmyk> characterisationChart()
+{
+    std::vector<Cmyk> coverages;
+    for (const auto& entry : MathProfile::toBeCalculated)
+        coverages.push_back(Cmyk{double(entry[0]), double(entry[1]), double(entry[2]), double(entry[3])});
+    return coverages;
+}
+
+} // namespace veltmarquist
 
 void MathProfile::convertChart(double** rows, int count, const char* path, double* channels, PrintProcess process)
 {
@@ -201,7 +213,7 @@ void MathProfile::convertChart(double** rows, int count, const char* path, doubl
             chartfile::limitY(reference.XYZ);
             white[r] = labOf(reference);
         }
-        w = blendWeight(deltaE(white[0], white[1]));
+        w = veltmarquist::chartConversionBlendWeight(deltaE(white[0], white[1]));
     }
 
     ColorPatch& sample = patchSlots[kSlotCurrentSample];

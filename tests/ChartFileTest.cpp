@@ -1,6 +1,7 @@
 // Chart file conventions: number format whatever the host's locale, the XYZ
 // layout bytes, the Y limit and the two-decimal cut.
 #include "ChartFile.h"
+#include "models/PrintModels.h"
 #include "TestSupport.h"
 
 #include <gtest/gtest.h>
@@ -31,11 +32,15 @@ TEST(ChartFile, LayoutAndNumbersWhateverTheHostLocale)
     chartfile::writeXYZLine(stream, 1234567, cmyk, xyz);
     stream << 100000.0 << ' ' << 1.0 / 3.0 << '\n';
     chartfile::finish(stream);
+    // The same line from values, Y limited (X and Z scaled by 100 / 1e6).
+    const std::string fromValues = veltmarquist::xyzChartText({{100, 0.5, 0.0000123, -0.0}}, {{12.3456, 1e6, 0.004}});
     std::locale::global(previous);
+    const std::string header = "IT8\r\nNUMBER_OF_SETS\t2\nNUMBER_OF_FIELDS\t8\nBEGIN_DATA_FORMAT\n"
+                               "Sample_Name\tCMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K\tXYZ_X\tXYZ_Y\tXYZ_Z\t\nEND_DATA_FORMAT\n";
     EXPECT_EQ(readFile(dir.path("c.txt")),
-              "IT8\r\nNUMBER_OF_SETS\t2\nNUMBER_OF_FIELDS\t8\nBEGIN_DATA_FORMAT\n"
-              "Sample_Name\tCMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K\tXYZ_X\tXYZ_Y\tXYZ_Z\t\nEND_DATA_FORMAT\n"
-              "BEGIN_DATA\n1234567\t100\t0.5\t1.23e-05\t-0\t12.34\t0\t1e+06\n100000 0.333333\nEND_DATA\n");
+              header + "BEGIN_DATA\n1234567\t100\t0.5\t1.23e-05\t-0\t12.34\t0\t1e+06\n100000 0.333333\nEND_DATA\n");
+    EXPECT_EQ(fromValues, "IT8\r\nNUMBER_OF_SETS\t1" + header.substr(header.find("\nNUMBER_OF_FIELDS")) +
+                              "BEGIN_DATA\n1\t100\t0.5\t1.23e-05\t-0\t0\t100\t0\nEND_DATA\n");
 
     std::ofstream unopenable;
     try {

@@ -127,6 +127,36 @@ VELTMARQUIST_API std::unique_ptr<PrintModel> fitGravureModel(const MeasuredForm&
 // ink spreading) fitted to all 46 patches; it predicts every coverage.
 VELTMARQUIST_API std::unique_ptr<PrintModel> fitYuleNielsenModel(const MeasuredForm& form);
 
+// ---- The charts' conventions, for hosts that hold values ------------------------------
+// The chart writers of processes 0, 1, 6 and 9 call these same functions, so
+// a host that applies them to predicted values gets the numbers and bytes of
+// the library's charts.
+
+// The 900 C, M, Y, K combinations of the characterisation chart (processes 0
+// and 1), in the chart's order. Every coverage is one of the form's levels.
+VELTMARQUIST_API std::vector<Cmyk> characterisationChart();
+
+// X, Y, Z limited to Y = 100 as every XYZ chart limits them: when Y > 100, X
+// and Z become X * 100 / Y and Z * 100 / Y, and Y becomes 100.
+VELTMARQUIST_API Triple limitToChartY(const Triple& XYZ);
+// X, Y, Z as an XYZ chart holds them: limited to Y = 100, then each cut toward
+// minus infinity at two decimals, floor(v * 100) / 100 (12.3456 -> 12.34).
+VELTMARQUIST_API Triple chartXYZ(const Triple& XYZ);
+
+// The text of an XYZ chart (the layout of processes 0, 1 and 6 and of the
+// 46-step chart) that holds one patch per coverage, numbered from 1: exactly
+// the bytes the library's writers produce, Y limit and two-decimal cut
+// included, whatever the host's locale. Throws std::invalid_argument when the
+// two lists differ in length. X, Y, Z that are not finite are written as they
+// are ("nan", "inf"); checking them is the host's part.
+VELTMARQUIST_API std::string xyzChartText(const std::vector<Cmyk>& coverages, const std::vector<Triple>& XYZ);
+
+// The weight of the converted spectra in a blended chart conversion (process
+// 9), from the CIE 1976 distance of the two reference whites:
+// w = 0.33 up to dE*ab 11, above it 0.33 / ((dE*ab - 10) / 25). Each patch
+// becomes w * converted + (1 - w) * measured.
+VELTMARQUIST_API double chartConversionBlendWeight(double deltaE);
+
 } // namespace veltmarquist
 
 #endif // VELTMARQUIST_PRINTMODELS_H

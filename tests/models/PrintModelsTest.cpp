@@ -1,7 +1,7 @@
 // The print models that return values: the golden charts of processes 0 and
-// 1 predicted patch by patch in a batch and one by one, the refusals, and the
-// statuses of the C entry points.
-#include "ChartFile.h"
+// 1 predicted patch by patch in a batch and one by one and written by the
+// library's chart writer from values, the refusals, and the statuses of the
+// C entry points.
 #include "ScratchAllocation.h"
 #include "TestSupport.h"
 #include "models/PrintModels.h"
@@ -46,25 +46,6 @@ Model fittedFromC(int selector, const std::string& golden)
     return Model(static_cast<PrintModel*>(handle));
 }
 
-// The 900 coverages of the characterisation chart, four values each.
-std::vector<double> chartCoverages()
-{
-    std::vector<double> cmyk;
-    for (const auto& entry : MathProfile::toBeCalculated)
-        cmyk.insert(cmyk.end(), entry.begin(), entry.end());
-    return cmyk;
-}
-
-// X, Y and Z as a chart line ends: Y limited to 100, cut to two decimals.
-std::string chartXYZ(Triple XYZ)
-{
-    chartfile::limitY(XYZ.data());
-    std::ostringstream text;
-    text.imbue(std::locale::classic());
-    text << chartfile::cut(XYZ[0]) << '\t' << chartfile::cut(XYZ[1]) << '\t' << chartfile::cut(XYZ[2]);
-    return text.str();
-}
-
 } // namespace
 
 TEST(PrintModels, PredictTheProfilesGoldenChartsInABatchAndOneByOne)
@@ -84,22 +65,24 @@ TEST(PrintModels, PredictTheProfilesGoldenChartsInABatchAndOneByOne)
         {"gravure, fitted factors through C", [] { return fittedFromC(VM_MODEL_GRAVURE_FITTED, "offset-form.in"); },
          "offset-form.rgb-p1.chart"},
     };
-    const std::vector<double> cmyk = chartCoverages();
+    const std::vector<Cmyk> chart = characterisationChart();
+    std::vector<double> cmyk;
+    for (const Cmyk& coverage : chart)
+        cmyk.insert(cmyk.end(), coverage.begin(), coverage.end());
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
         const Model model = c.fit();
         ASSERT_NE(model, nullptr);
         std::vector<double> XYZ(3 * 900), Lab(3 * 900);
         model->predict(900, cmyk.data(), nullptr, XYZ.data(), Lab.data());
-        const auto chart = lines(readFile(goldenPath(c.chart)));
+        std::vector<Triple> one;
         for (size_t i = 0; i < 900; ++i) {
-            const auto golden = fields(chart.at(7 + i));
-            const Triple xyz = spectrumToXYZ(model->predict({cmyk[4 * i], cmyk[4 * i + 1], cmyk[4 * i + 2],
-                                                             cmyk[4 * i + 3]})), lab = XYZToLab(xyz);
-            EXPECT_EQ(chartXYZ(xyz), golden.at(5) + '\t' + golden.at(6) + '\t' + golden.at(7)) << "patch " << i + 1;
+            const Triple xyz = spectrumToXYZ(model->predict(chart[i])), lab = XYZToLab(xyz);
+            one.push_back(xyz);
             EXPECT_EQ(std::memcmp(xyz.data(), &XYZ[3 * i], sizeof xyz), 0) << "batch, patch " << i + 1;
             EXPECT_EQ(std::memcmp(lab.data(), &Lab[3 * i], sizeof lab), 0) << "batch, patch " << i + 1;
         }
+        EXPECT_EQ(xyzChartText(chart, one), readFile(goldenPath(c.chart)));
     }
     // The fitted values that the golden charts were made with.
     const auto offset = fitOffsetModel(formOf("offset-form.in"));

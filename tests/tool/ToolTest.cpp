@@ -156,6 +156,8 @@ TEST(CommandLine, EveryCommandEqualsTheLibrarysCharts)
         // Percent reflectance; the chart combinations measured beyond the test form check the model.
         {{"chart", VELTMARQUIST_SAMPLES_DIR "/offset_press_sheet.txt", "-o", "c.txt"}, "",
          "check: 230 chart combinations measured beyond the test form, CIEDE2000 mean 0."},
+        {{"chart", VELTMARQUIST_SAMPLES_DIR "/offset_press_sheet.txt", "-o", "c.txt", "--model", "ynsn"}, "",
+         "chart: 900 patches (Yule-Nielsen model) written to c.txt\ncheck: 230 combinations measured beyond"},
     };
     for (const auto& [arguments, golden, printed] : cases) {
         const ToolRun run = runTool(arguments, dir.dir());
@@ -232,6 +234,7 @@ TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
          "no-folder/c.txt: cannot create a file in no-folder/"},
         {{"chrat", "form7.txt"}, 2, "unknown command 'chrat'; commands: chart, compare, multichannel, convert"},
         {{"chart", "keep.txt", "-o", "./keep.txt"}, 2, "./keep.txt: is the same file as the input keep.txt"},
+        {{"compare", "keep.txt", "--model", "ynsn", "--fit-gravure"}, 2, "--fit-gravure chooses among the library's"},
         // Control characters from a path or a file are shown escaped.
         {{"chart", "in\x1b[2J\t.txt", "-o", "out.txt"}, 3, "in\\x1b[2J\\t.txt: cannot open"},
     };

@@ -1,14 +1,8 @@
-// Profile handle, status mapping and colour differences.
+// Profile handle and status mapping.
 #include "LibraryHost.h"
 
 #include "ToolError.h"
 
-#include <lcms2.h>
-
-#include <algorithm>
-#include <cmath>
-#include <cstdio>
-#include <cstring>
 #include <exception>
 
 namespace veltmarquist {
@@ -68,70 +62,6 @@ void Profile::run(const std::string& what, const std::function<void(MathProfile&
     } catch (const std::exception& failure) {
         throw ToolError(Failure::Calculation, what + " failed: " + failure.what());
     }
-}
-
-// ---- Colour ---------------------------------------------------------------------------------
-
-Lab labOfXYZ(const std::array<double, 3>& XYZ)
-{
-    const cmsCIEXYZ xyz{XYZ[0] / 100.0, XYZ[1] / 100.0, XYZ[2] / 100.0};
-    cmsCIELab lab;
-    cmsXYZ2Lab(cmsD50_XYZ(), &lab, &xyz);
-    return Lab{lab.L, lab.a, lab.b};
-}
-
-double deltaEab(const Lab& first, const Lab& second)
-{
-    const cmsCIELab a{first.L, first.a, first.b}, b{second.L, second.a, second.b};
-    return cmsDeltaE(&a, &b);
-}
-
-double deltaE2000(const Lab& first, const Lab& second)
-{
-    const cmsCIELab a{first.L, first.a, first.b}, b{second.L, second.a, second.b};
-    return cmsCIE2000DeltaE(&a, &b, 1.0, 1.0, 1.0);
-}
-
-std::array<double, 3> XYZOfBands(const std::vector<double>& bands)
-{
-    MathProfile colorimetry("colorimetry");
-    MathProfile::ColorPatch patch;
-    std::memset(&patch, 0, sizeof patch);
-    std::copy(bands.begin(), bands.begin() + MathProfile::kBands, patch.spectrum);
-    colorimetry.spec2XYZ(&patch);
-    std::array<double, 3> XYZ{patch.XYZ[0], patch.XYZ[1], patch.XYZ[2]};
-    if (XYZ[1] > 100.0) {
-        XYZ[0] = XYZ[0] * 100.0 / XYZ[1];
-        XYZ[2] = XYZ[2] * 100.0 / XYZ[1];
-        XYZ[1] = 100.0;
-    }
-    return XYZ;
-}
-
-Summary summarise(std::vector<double> values)
-{
-    Summary summary;
-    summary.count = values.size();
-    if (values.empty())
-        return summary;
-    std::sort(values.begin(), values.end());
-    double sum = 0.0;
-    for (double value : values)
-        sum += value;
-    summary.mean = sum / static_cast<double>(values.size());
-    summary.max = values.back();
-    const double rank = 0.95 * static_cast<double>(values.size() - 1);
-    const size_t below = static_cast<size_t>(rank);
-    const size_t above = std::min(below + 1, values.size() - 1);
-    summary.p95 = values[below] + (rank - static_cast<double>(below)) * (values[above] - values[below]);
-    return summary;
-}
-
-std::string fixed(double value, int decimals)
-{
-    char text[64];
-    std::snprintf(text, sizeof text, "%.*f", decimals, value);
-    return text;
 }
 
 } // namespace veltmarquist

@@ -1,11 +1,13 @@
 // veltmarquist: the command-line host of the library.
 //
-// Parses the command line, runs one command, and maps every failure to one
-// line on stderr and a documented exit code.
-#include "Commands.h"
+// Parses the command line, runs one command, renders its result as the
+// report, and maps every failure to one line on stderr and a documented exit
+// code.
 #include "Messages.h"
 #include "OutputFile.h"
 #include "ToolError.h"
+#include "commands/Commands.h"
+#include "report/TextReport.h"
 
 #include "VeltmarquistDLL.h"
 
@@ -70,14 +72,43 @@ PrintProcess fourColourProcess(const std::string& name)
     return name == "gravure" ? VM_PROCESS_GRAVURE : VM_PROCESS_OFFSET;
 }
 
+void addModel(CLI::App& command, std::string& model)
+{
+    command
+        .add_option("--model", model,
+                    "library: the library's offset or gravure model (see --process); ynsn: the Yule-Nielsen "
+                    "spectral Neugebauer model, for any coverage")
+        ->check(CLI::IsMember({"library", "ynsn"}))
+        ->capture_default_str();
+}
+
 // The process of chart and compare: --fit-gravure implies gravure and
-// contradicts an explicit --process offset.
-PrintProcess chosenProcess(const CLI::App& command, const std::string& name, bool fitGravure)
+// contradicts an explicit --process offset; both choose among the library's
+// models and contradict --model ynsn.
+PrintProcess chosenProcess(const CLI::App& command, const std::string& name, bool fitGravure, bool yuleNielsen)
 {
     const bool given = command.get_option("--process")->count() > 0;
+    if (yuleNielsen && (given || fitGravure))
+        throw ToolError(Failure::Usage, std::string(given ? "--process" : "--fit-gravure") +
+                                            " chooses among the library's models; it cannot go with --model ynsn");
     if (fitGravure && given && name == "offset")
         throw ToolError(Failure::Usage, "--fit-gravure fits the gravure model; it cannot go with --process offset");
     return fitGravure ? VM_PROCESS_GRAVURE : fourColourProcess(name);
+}
+
+// Runs a command and renders its result, also the part a failure left.
+template <typename Result, typename Options>
+void runAndRender(void (*run)(const Options&, Result&), void (*render)(const Result&, std::ostream&),
+                  const Options& options, std::ostream& report)
+{
+    Result result;
+    try {
+        run(options, result);
+    } catch (...) {
+        render(result, report);
+        throw;
+    }
+    render(result, report);
 }
 
 int fail(const ToolError& error, std::ostream& report)
@@ -124,7 +155,7 @@ int main(int argc, char** argv)
     app.require_subcommand(1);
     app.footer(kExitCodes);
 
-    std::string scale = "auto", processName = "offset";
+    std::string scale = "auto", processName = "offset", model = "library";
 
     ChartOptions chart;
     CLI::App* chartCommand = app.add_subcommand(
@@ -137,6 +168,7 @@ int main(int argc, char** argv)
         ->capture_default_str();
     chartCommand->add_flag("--fit-gravure", chart.fitGravure,
                            "fit the gravure ink order and trapping factors first (implies --process gravure)");
+    addModel(*chartCommand, model);
     addScale(*chartCommand, scale);
 
     CompareOptions compare;
@@ -144,12 +176,13 @@ int main(int argc, char** argv)
         "compare", "measured and modelled 46-step charts of a test form and their colour differences");
     compareCommand->add_option("FORM", compare.form, "measurement file with the 46 test-form patches")->required();
     compareCommand->add_option("-o,--output-folder", compare.outputFolder,
-                               "folder for FORM.measured46.txt and FORM.offset46.txt / FORM.gravure46.txt")
+                               "folder for FORM.measured46.txt and FORM.offset46.txt / .gravure46.txt / .ynsn46.txt")
         ->capture_default_str();
     compareCommand->add_option("--process", processName, "print model")
         ->check(CLI::IsMember({"offset", "gravure"}))
         ->capture_default_str();
     compareCommand->add_flag("--fit-gravure", compare.fitGravure, "fit the gravure model first");
+    addModel(*compareCommand, model);
     addScale(*compareCommand, scale);
 
     MultiChannelOptions multi;
@@ -215,23 +248,25 @@ int main(int argc, char** argv)
     try {
         const ReadOptions read = readOptions(scale);
         if (*chartCommand) {
-            chart.process = chosenProcess(*chartCommand, processName, chart.fitGravure);
+            chart.yuleNielsen = model == "ynsn";
+            chart.process = chosenProcess(*chartCommand, processName, chart.fitGravure, chart.yuleNielsen);
             chart.read = read;
-            runChart(chart, report);
+            runAndRender(runChart, renderChart, chart, report);
         } else if (*compareCommand) {
-            compare.process = chosenProcess(*compareCommand, processName, compare.fitGravure);
+            compare.yuleNielsen = model == "ynsn";
+            compare.process = chosenProcess(*compareCommand, processName, compare.fitGravure, compare.yuleNielsen);
             compare.read = read;
-            runCompare(compare, report);
+            runAndRender(runCompare, renderCompare, compare, report);
         } else if (*multiCommand) {
             multi.read = read;
-            runMultiChannel(multi, report);
+            runAndRender(runMultiChannel, renderMultiChannel, multi, report);
         } else if (*convertCommand) {
             convert.mode = mode == "copy" ? VM_PROCESS_CHART_COPY
                                           : mode == "blend" ? VM_PROCESS_CHART_BLEND : VM_PROCESS_CHART_CONVERT;
             if (convert.mode != VM_PROCESS_CHART_COPY && (convert.from.empty() || convert.to.empty()))
                 throw ToolError(Failure::Usage, "--mode " + mode + " needs --from and --to");
             convert.read = read;
-            runConvert(convert, report);
+            runAndRender(runConvert, renderConvert, convert, report);
         }
     } catch (const ToolError& error) {
         return fail(error, report);

@@ -1,16 +1,14 @@
 // Picking the patches a calculation needs out of a measurement file by their
-// device values, and turning them into the library's measurement block.
+// device values.
 //
 // A measured test form and a full characterisation measurement both work: a
 // patch is found by its C, M, Y, K (and further channel) values wherever it
 // stands in the file; repeated measurements of one combination are averaged;
 // everything else in the file is ignored.
-#ifndef VELTMARQUIST_TOOL_PATCHMATCHING_H
-#define VELTMARQUIST_TOOL_PATCHMATCHING_H
+#ifndef VELTMARQUIST_FORMS_PATCHMATCHING_H
+#define VELTMARQUIST_FORMS_PATCHMATCHING_H
 
 #include "MeasurementFile.h"
-
-#include "MathProfile.h"
 
 #include <map>
 #include <string>
@@ -63,47 +61,6 @@ struct PickedPatches {
 PickedPatches pickPatches(const MeasurementFile& file, const std::vector<PatchRequest>& requests,
                           const std::string& fileName);
 
-// ---- The library's measurement block ---------------------------------------------
-
-// Integers as CalculateChart takes them: reflectance x 1000, patch after patch.
-struct MeasurementBlock {
-    int inputKind = VM_INPUT_10NM;
-    int firstWavelength = 380;
-    int valuesPerPatch = 36;
-    int count = 0;
-    std::vector<int> ints;
-};
-
-// A spectrum in the library's thousandths and the layout of its bands.
-struct Spectrum {
-    const SpectralLayout* layout;
-    const std::vector<int>* thousandths;
-};
-// The thousandths of one set.
-std::vector<int> thousandthsOf(const MeasurementSet& set);
-
-// The block of the spectra, padded with zeros to at least `minimumInts`.
-// Spectra of 16 bands (all of them) go in as input kind 20; everything else as
-// 36 bands, 380 to 730 nm: bands outside that range are dropped, and the
-// bands in front of the first or behind the last measured band repeat it.
-MeasurementBlock buildBlock(const std::vector<Spectrum>& spectra, size_t minimumInts = 0);
-
-// The 36-band spectrum (380..730 nm) that the library makes of one spectrum.
-std::vector<double> libraryBands(const Spectrum& spectrum);
-
-// A row table as CalculateChart builds it from a block: 2000 entries, rows
-// 0 to count - 1 present, 36 values each. For the class methods that no entry
-// point reaches (the gravure fit, the 46-step chart).
-class RowTable {
-public:
-    explicit RowTable(const MeasurementBlock& block);
-    double** rows() { return table_.data(); }
-
-private:
-    std::vector<std::vector<double>> storage_;
-    std::vector<double*> table_;
-};
-
 } // namespace veltmarquist
 
-#endif // VELTMARQUIST_TOOL_PATCHMATCHING_H
+#endif // VELTMARQUIST_FORMS_PATCHMATCHING_H

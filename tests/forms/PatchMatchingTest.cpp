@@ -1,8 +1,9 @@
-// Patch matching and the library's measurement block, from golden test forms written as CGATS.
+// Patch matching and the test form found by it, from golden test forms written as CGATS.
 #include "../TestSupport.h"
 #include "Cgats.h"
 #include "MeasurementFile.h"
 #include "PatchMatching.h"
+#include "TestForm.h"
 #include "ToolError.h"
 
 #include <gtest/gtest.h>
@@ -36,13 +37,9 @@ cgats::Document goldenForm(const ts::MeasurementBlock& block)
 
 MeasurementBlock blockOf(const cgats::Document& form)
 {
-    const ReadResult read = readMeasurementText(cgats::write(form));
+    ReadResult read = readMeasurementText(cgats::write(form));
     EXPECT_TRUE(read.ok()) << read.error.describe();
-    const PickedPatches picked = pickPatches(*read.file, testFormRequests(), "form.txt");
-    std::vector<Spectrum> spectra;
-    for (const std::vector<int>& thousandths : picked.thousandths)
-        spectra.push_back({&read.file->layout, &thousandths});
-    return buildBlock(spectra);
+    return findTestForm(std::move(*read.file), "form.txt").block;
 }
 
 } // namespace
@@ -91,23 +88,4 @@ TEST(PatchMatching, EveryMissingPatchIsNamedInOneLine)
         EXPECT_STREQ(error.what(), "form.txt: 3 test-form patches are missing: 18 (C 0 M 90 Y 0 K 0), "
                                    "19 (C 100 M 100 Y 100 K 100), 20 (C 0 M 0 Y 100 K 0)");
     }
-}
-
-TEST(PatchMatching, OtherLayoutsAreWidenedAsTheLibraryWould)
-{
-    const SpectralLayout narrow{400, 10, 31}, sixteen{400, 20, 16};
-    std::vector<int> fine(31), coarse(16);
-    for (int j = 0; j < 31; ++j)
-        fine[j] = 100 + 10 * j;
-    for (int j = 0; j < 16; ++j)
-        coarse[j] = 200 + 20 * j;
-    // 400-700 nm in 10 nm steps, alone (bands outside repeat the first and last one) and mixed with 16 bands
-    // widened as the library would, as they are in the rows of the class methods.
-    const MeasurementBlock mixed = buildBlock({{&narrow, &fine}, {&sixteen, &coarse}}, 100);
-    RowTable rows(buildBlock({{&sixteen, &coarse}}));
-    const std::pair<size_t, int> ints[] = {{0, 100}, {2, 100}, {3, 110}, {35, 400}, {36, 220}, {41, 230}, {71, 500}};
-    for (const auto& [index, value] : ints) // 380, 400, 410, 730 nm; 16 bands at 380 (takes 420), 430 (between), 730
-        EXPECT_EQ(mixed.ints[index], value) << "int " << index;
-    EXPECT_DOUBLE_EQ(rows.rows()[0][5], 0.230);
-    EXPECT_EQ(rows.rows()[1], nullptr);
 }

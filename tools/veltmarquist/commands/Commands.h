@@ -1,28 +1,31 @@
-// The tool's commands. Each reads its inputs, runs the library and writes its
-// outputs, reports to `out`, and throws a ToolError on any failure (with no
-// output left behind under its final name).
+// The tool's commands. Each reads its inputs, runs the library, writes its
+// outputs and fills its result (results/Results.h) as it goes; on any
+// failure it throws a ToolError, with no output left behind under its final
+// name and the result holding the steps it finished.
 #ifndef VELTMARQUIST_TOOL_COMMANDS_H
 #define VELTMARQUIST_TOOL_COMMANDS_H
 
 #include "MeasurementFile.h"
+#include "results/Results.h"
 
 #include "VeltmarquistDLL.h"
 
-#include <ostream>
 #include <string>
 
 namespace veltmarquist {
 
 // chart FORM -o CHART: the 900-patch characterisation chart of a four-colour
-// process from the 46 test-form patches (process 0 or 1).
+// process from the 46 test-form patches: process 0 or 1 of the library, or
+// the Yule-Nielsen model written in the library's layout.
 struct ChartOptions {
     std::string form;
     std::string output;
     PrintProcess process = VM_PROCESS_OFFSET;
-    bool fitGravure = false; // fit ink order and trapping factors first (gravure only)
+    bool fitGravure = false;  // fit ink order and trapping factors first (gravure only)
+    bool yuleNielsen = false; // the Yule-Nielsen model instead of the library's
     ReadOptions read;
 };
-void runChart(const ChartOptions& options, std::ostream& out);
+void runChart(const ChartOptions& options, ChartResult& result);
 
 // compare FORM: the measured and the modelled 46-step charts and their
 // colour differences, patch by patch.
@@ -31,9 +34,10 @@ struct CompareOptions {
     std::string outputFolder = ".";
     PrintProcess process = VM_PROCESS_OFFSET;
     bool fitGravure = false;
+    bool yuleNielsen = false;
     ReadOptions read;
 };
-void runCompare(const CompareOptions& options, std::ostream& out);
+void runCompare(const CompareOptions& options, CompareResult& result);
 
 // multichannel FORM --inks 6|7 -o CHART: the six- or seven-colour spectral
 // chart (process 3 or 5), the extended C, M, Y, K combinations for the
@@ -48,7 +52,7 @@ struct MultiChannelOptions {
     std::string separatedOutput;
     ReadOptions read;
 };
-void runMultiChannel(const MultiChannelOptions& options, std::ostream& out);
+void runMultiChannel(const MultiChannelOptions& options, MultiChannelResult& result);
 
 // convert CHART --from WHITE --to WHITE -o OUT: a measured chart copied,
 // converted from one paper white to another, or blended (processes 7-9).
@@ -61,7 +65,7 @@ struct ConvertOptions {
     bool cmykOnly = false; // drop ink in channels 5-7 instead of refusing the chart
     ReadOptions read;
 };
-void runConvert(const ConvertOptions& options, std::ostream& out);
+void runConvert(const ConvertOptions& options, ConvertResult& result);
 
 } // namespace veltmarquist
 

@@ -1,0 +1,49 @@
+// The test form found in a measurement file.
+#include "TestForm.h"
+
+#include "MeasurementLoading.h"
+
+#include <algorithm>
+
+namespace veltmarquist {
+
+namespace {
+
+// Header keywords that state how the file was measured.
+const char* const kConditionKeywords[] = {
+    "MEASUREMENT_CONDITION", "MEASUREMENT_SOURCE", "ILLUMINATION_NAME", "OBSERVER_ANGLE",   "FILTER",
+    "POLARIZATION",          "WEIGHTING_FUNCTION", "SAMPLE_BACKING",    "MEASUREMENT_GEOMETRY", "INSTRUMENTATION",
+};
+
+bool isCondition(const std::string& keyword)
+{
+    return std::any_of(std::begin(kConditionKeywords), std::end(kConditionKeywords),
+                       [&](const char* name) { return keyword == name; });
+}
+
+} // namespace
+
+FoundForm findTestForm(const std::string& path, const ReadOptions& options)
+{
+    return findTestForm(loadMeasurementFile(path, options), path);
+}
+
+FoundForm findTestForm(MeasurementFile file, const std::string& path)
+{
+    FoundForm found{path, std::move(file), {}, {}, {}, {}};
+    found.picked = pickPatches(found.file, testFormRequests(), path);
+    std::vector<MeasuredSpectrum> spectra;
+    for (const std::vector<int>& thousandths : found.picked.thousandths) {
+        spectra.push_back({&found.file.layout, &thousandths});
+        const std::vector<double> bands = libraryBands(spectra.back());
+        found.spectra.emplace_back();
+        std::copy_n(bands.begin(), kSpectrumBands, found.spectra.back().begin());
+    }
+    found.block = buildBlock(spectra);
+    for (const auto& [keyword, value] : found.file.keywords)
+        if (isCondition(keyword))
+            found.conditions.emplace_back(keyword, value);
+    return found;
+}
+
+} // namespace veltmarquist

@@ -1,0 +1,240 @@
+// The terminal text of each command.
+#include "TextReport.h"
+
+#include "Messages.h"
+
+#include <algorithm>
+#include <cctype>
+#include <cstdio>
+#include <string>
+
+namespace veltmarquist {
+
+namespace {
+
+// "%g" and "%.Nf" without locale surprises (the tool never sets a locale).
+std::string number(double value)
+{
+    char text[32];
+    std::snprintf(text, sizeof text, "%g", value);
+    return text;
+}
+
+std::string fixed(double value, int decimals = 2)
+{
+    char text[64];
+    std::snprintf(text, sizeof text, "%.*f", decimals, value);
+    return text;
+}
+
+std::string describeCmyk(const Cmyk& cmyk)
+{
+    return describeDevice(std::vector<double>(cmyk.begin(), cmyk.end()));
+}
+
+void printWarnings(const FileWarnings& file)
+{
+    for (const std::string& warning : file.warnings)
+        printMessage("warning", file.path + ": " + warning);
+}
+
+void printForm(const FoundForm& form, std::ostream& out)
+{
+    const MeasurementFile& file = form.file;
+    out << "form: " << form.path << ": " << file.sets.size() << " measurements, " << file.describeSpectra()
+        << ", reflectance 0-" << number(file.scale) << (file.scaleDetected ? " (detected)" : " (given)")
+        << "\n  46 test-form patches found in " << form.picked.setsUsed << " measurements";
+    if (form.picked.averaged > 0)
+        out << " (repeated measurements averaged for " << form.picked.averaged << " of them)";
+    out << "; " << form.picked.setsIgnored << " other measurements ignored\n";
+}
+
+// The fitted value whose name starts with `name`; empty numbers when there is none.
+const FittedValue& valueNamed(const PrintModel& model, const std::string& name)
+{
+    static const FittedValue none;
+    const std::vector<FittedValue>& values = model.fittedValues();
+    const auto found = std::find_if(values.begin(), values.end(),
+                                    [&](const FittedValue& value) { return value.name.rfind(name, 0) == 0; });
+    return found == values.end() ? none : *found;
+}
+
+std::string inks(const std::vector<double>& numbers, int decimals)
+{
+    static const char* const letters[] = {"C", "M", "Y", "K"};
+    std::string text;
+    for (size_t ink = 0; ink < numbers.size() && ink < 4; ++ink)
+        text += std::string(ink == 0 ? "" : "  ") + letters[ink] + " " + fixed(numbers[ink], decimals);
+    return text;
+}
+
+void printYuleNielsen(const PrintModel& model, const std::string& formPath, std::ostream& out)
+{
+    const std::vector<double>& n = valueNamed(model, "Yule-Nielsen n").numbers;
+    const std::vector<double>& tint = valueNamed(model, "tint residual").numbers;
+    const std::vector<double>& grey = valueNamed(model, "grey dE*ab").numbers;
+    out << "Yule-Nielsen model fitted to the 46 test-form patches:\n";
+    if (!n.empty())
+        out << "  Yule-Nielsen n          " << fixed(*std::min_element(n.begin(), n.end())) << " to "
+            << fixed(*std::max_element(n.begin(), n.end())) << " over 380-730 nm\n";
+    out << "  ink spreading           " << inks(valueNamed(model, "ink spreading").numbers, 3) << "\n";
+    if (!tint.empty())
+        out << "  tint residual           " << fixed(tint[0], 4) << " RMS reflectance\n";
+    if (grey.size() == 2)
+        out << "  grey residuals          " << fixed(grey[0]) << " dE*ab (C40 M40 Y40), " << fixed(grey[1])
+            << " dE*ab (C40 M40 Y40 K40)\n";
+    // The fit's warnings are sentences; as messages they lose the capital and the full stop.
+    for (const FittedValue& value : model.fittedValues()) {
+        if (value.name != "warning" || value.text.empty())
+            continue;
+        std::string warning = value.text;
+        warning[0] = static_cast<char>(std::tolower(static_cast<unsigned char>(warning[0])));
+        if (warning.back() == '.')
+            warning.pop_back();
+        printMessage("warning", formPath + ": Yule-Nielsen model: " + warning);
+    }
+}
+
+void printModel(const FittedModel& fit, const std::string& formPath, std::ostream& out)
+{
+    const PrintModel& model = *fit.model;
+    if (fit.yuleNielsen) {
+        printYuleNielsen(model, formPath, out);
+    } else if (fit.process == VM_PROCESS_GRAVURE) {
+        static const char* const orders[] = {"CMYK", "KCMY", "YCMK", "YMKC", "YKMC"};
+        const std::string order = valueNamed(model, "ink order").text;
+        const long index = std::find(std::begin(orders), std::end(orders), order) - std::begin(orders);
+        const std::vector<double>& factor = valueNamed(model, "trapping factors").numbers;
+        out << "gravure model"
+            << (fit.gravureFitted ? " fitted to the red, green and blue overprints:\n"
+                                  : " (defaults; --fit-gravure fits them):\n")
+            << "  ink order               " << order << " (" << index << ")\n"
+            << "  trapping factors        red " << number(factor.at(0)) << "  green " << number(factor.at(1))
+            << "  blue " << number(factor.at(2)) << "\n";
+    } else {
+        const std::vector<double>& factor = valueNamed(model, "gray difference factor").numbers;
+        out << "offset model fitted to the two greys:\n"
+            << "  gray difference factor  C " << number(factor.at(0)) << "  M " << number(factor.at(1)) << "  Y "
+            << number(factor.at(2)) << "  K " << number(factor.at(3)) << "\n"
+            << "  coverage limit          " << number(valueNamed(model, "coverage limit").numbers.at(0)) << " %\n";
+    }
+}
+
+void printSummary(const std::string& what, const Summary& summary, std::ostream& out)
+{
+    out << what << " mean " << fixed(summary.mean) << ", 95th percentile " << fixed(summary.p95) << ", max "
+        << fixed(summary.max) << "\n";
+}
+
+void printCheck(const ChartResult& result, std::ostream& out)
+{
+    if (result.check.empty())
+        return;
+    const CheckSummary& all = result.checkSummary;
+    if (!result.fit->yuleNielsen) {
+        printSummary("check: " + std::to_string(all.deltaE2000.count) +
+                         " chart combinations measured beyond the test form, CIEDE2000",
+                     all.deltaE2000, out);
+    } else {
+        printSummary("check: " + std::to_string(all.deltaE2000.count) +
+                         " combinations measured beyond the test form, CIEDE2000",
+                     all.deltaE2000, out);
+        if (result.chartCheckSummary.deltaE2000.count > 0)
+            printSummary("  " + std::to_string(result.chartCheckSummary.deltaE2000.count) + " of them on the chart:",
+                         result.chartCheckSummary.deltaE2000, out);
+        static const char* const blacks[] = {"K 0", "K 1-40", "K 41-85", "K 86-100"};
+        std::string means;
+        for (size_t range = 0; range < 4; ++range)
+            if (all.byBlack[range].count > 0)
+                means += (means.empty() ? "" : ", ") + std::string(blacks[range]) + " " +
+                         fixed(all.byBlack[range].mean) + " (" + std::to_string(all.byBlack[range].count) + ")";
+        out << "  means by black (combinations): " << means << "\n";
+    }
+    out << "  largest difference at " << describeCmyk(result.check[all.largest].device) << "\n";
+}
+
+// The form and the model, as far as they came; true when the model came.
+bool printFormAndModel(const FormAndModel& result, std::ostream& out)
+{
+    printWarnings(result.formWarnings);
+    if (result.form)
+        printForm(*result.form, out);
+    if (result.fit)
+        printModel(*result.fit, result.form->path, out);
+    return result.fit.has_value();
+}
+
+} // namespace
+
+void renderChart(const ChartResult& result, std::ostream& out)
+{
+    if (!printFormAndModel(result, out) || result.written.empty())
+        return;
+    out << "chart: " << result.coverages.size() << " patches ("
+        << (result.fit->yuleNielsen ? "Yule-Nielsen" : result.fit->name()) << " model) written to " << result.written
+        << "\n";
+    printCheck(result, out);
+}
+
+void renderCompare(const CompareResult& result, std::ostream& out)
+{
+    if (!printFormAndModel(result, out) || result.modelWritten.empty())
+        return;
+    out << "measured 46-step chart written to " << result.measuredWritten << "\n"
+        << "modelled 46-step chart (" << result.fit->name() << ") written to " << result.modelWritten << "\n"
+        << "patch  C    M    Y    K     dE*ab   dE00\n";
+    for (size_t i = 0; i < result.patches.size(); ++i) {
+        const CheckedPatch& patch = result.patches[i];
+        char line[96];
+        std::snprintf(line, sizeof line, "%5zu  %-4g %-4g %-4g %-4g %6.2f %6.2f\n", i + 1, patch.device[0],
+                      patch.device[1], patch.device[2], patch.device[3], patch.deltaEab, patch.deltaE2000);
+        out << line;
+    }
+    printSummary("dE*ab    over " + std::to_string(result.deltaEab.count) + " patches:", result.deltaEab, out);
+    printSummary("CIEDE2000 over " + std::to_string(result.deltaE2000.count) + " patches:", result.deltaE2000, out);
+}
+
+void renderMultiChannel(const MultiChannelResult& result, std::ostream& out)
+{
+    printWarnings(result.formWarnings);
+    if (result.form && result.picked) {
+        const MeasurementFile& form = *result.form;
+        out << "form: " << result.formWarnings.path << ": " << form.sets.size() << " measurements, "
+            << form.describeSpectra() << ", reflectance 0-" << (form.scale == 100.0 ? "100" : "1")
+            << (form.scaleDetected ? " (detected)" : " (given)") << "\n  paper and " << result.inks
+            << " solids found; " << result.picked->setsIgnored << " other measurements ignored\n";
+    }
+    printWarnings(result.separationsWarnings);
+    if (result.chartWritten.empty())
+        return;
+    out << (result.inks == 6 ? "six-colour chart: 128" : "seven-colour chart: 159")
+        << " spectral patches written to " << result.chartWritten << "\n";
+    if (!result.combinationsWritten.empty())
+        out << "combinations: 3499 C, M, Y, K combinations for the separation software written to "
+            << result.combinationsWritten << "\n";
+    if (!result.separatedWritten.empty())
+        out << "separated set: 3499 patches (XYZ) predicted from " << result.separationsPath << " written to "
+            << result.separatedWritten << "\n";
+}
+
+void renderConvert(const ConvertResult& result, std::ostream& out)
+{
+    for (const FileWarnings& file : result.warnings)
+        printWarnings(file);
+    if (result.written.empty())
+        return;
+    if (result.mode == VM_PROCESS_CHART_COPY) {
+        out << "chart: " << result.patches << " patches copied to " << result.written << "\n";
+        return;
+    }
+    const bool blend = result.mode == VM_PROCESS_CHART_BLEND;
+    out << "whites: " << result.fromLabel << " -> " << result.toLabel << ", " << fixed(result.whitesApart)
+        << " dE*ab apart\n";
+    if (blend)
+        out << "blend: converted spectra weighted " << fixed(result.blendWeight, 3) << ", measured spectra "
+            << fixed(1.0 - result.blendWeight, 3) << "\n";
+    out << "chart: " << result.patches << " patches " << (blend ? "blended" : "converted") << ", written to "
+        << result.written << "\n";
+}
+
+} // namespace veltmarquist

@@ -1,0 +1,94 @@
+// What each command found and computed, apart from how it is shown.
+//
+// A command fills its result step by step as it goes: when it fails, the
+// steps it finished stay filled (and are shown before the error, as a run
+// shows them), the others stay empty. Plain values only: no printing here
+// (report/TextReport.h renders them as the terminal text).
+#ifndef VELTMARQUIST_TOOL_RESULTS_H
+#define VELTMARQUIST_TOOL_RESULTS_H
+
+#include "ColourDifference.h"
+#include "MeasurementFile.h"
+#include "PatchMatching.h"
+#include "PredictionCheck.h"
+#include "TestForm.h"
+
+#include "VeltmarquistDLL.h"
+#include "models/PrintModels.h"
+
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace veltmarquist {
+
+// The warnings of one input file (the reader's and the paper's).
+struct FileWarnings {
+    std::string path;
+    std::vector<std::string> warnings;
+};
+
+// A four-colour model fitted to the form, and how it was chosen.
+struct FittedModel {
+    std::shared_ptr<const PrintModel> model;
+    PrintProcess process = VM_PROCESS_OFFSET; // the library's process (offset or gravure)
+    bool yuleNielsen = false;                 // the Yule-Nielsen model instead of the library's
+    bool gravureFitted = false;               // gravure order and factors fitted to red, green, blue
+
+    // "offset", "gravure" or "ynsn": in file names and the report.
+    const char* name() const { return yuleNielsen ? "ynsn" : process == VM_PROCESS_GRAVURE ? "gravure" : "offset"; }
+};
+
+// What chart and compare begin with: the form found, the model fitted.
+struct FormAndModel {
+    FileWarnings formWarnings;
+    std::optional<FoundForm> form;
+    std::optional<FittedModel> fit;
+};
+
+// chart FORM -o CHART
+struct ChartResult : FormAndModel {
+    std::vector<Cmyk> coverages;      // the chart's patches
+    std::vector<Triple> predicted;    // their X, Y, Z as the model gives them (the chart limits and cuts them)
+    std::string written;              // how messages name the delivered chart; empty until delivered
+    // The combinations FORM measured beyond the test form against the
+    // model: the chart's combinations in chart order, then (for a model that
+    // predicts every coverage) all others in file order.
+    std::vector<CheckedPatch> check;
+    CheckSummary checkSummary;        // of every checked patch
+    CheckSummary chartCheckSummary;   // of those on the chart
+};
+
+// compare FORM
+struct CompareResult : FormAndModel {
+    std::string measuredWritten, modelWritten; // empty until delivered
+    std::vector<CheckedPatch> patches;         // the 46 patches, X, Y, Z as their charts hold them
+    Summary deltaEab, deltaE2000;
+};
+
+// multichannel FORM --inks 6|7 -o CHART
+struct MultiChannelResult {
+    int inks = 7;
+    FileWarnings formWarnings;
+    std::optional<MeasurementFile> form;
+    std::optional<PickedPatches> picked;
+    FileWarnings separationsWarnings;
+    std::string separationsPath;
+    std::string chartWritten, combinationsWritten, separatedWritten; // empty until delivered
+};
+
+// convert CHART
+struct ConvertResult {
+    std::vector<FileWarnings> warnings; // the chart's, then the whites' files
+    PrintProcess mode = VM_PROCESS_CHART_CONVERT;
+    std::string fromLabel, toLabel;     // "'PAPER' " for a sample name, else the file
+    double whitesApart = 0.0;           // CIE 1976 dE*ab of the two whites
+    double blendWeight = 0.0;           // weight of the converted spectra (blend)
+    size_t patches = 0;
+    std::string written;                // empty until delivered
+};
+
+} // namespace veltmarquist
+
+#endif // VELTMARQUIST_TOOL_RESULTS_H
