@@ -1,26 +1,68 @@
-// The bundled offset form and models fitted to it, shared by the export tests.
+// The bundled offset form, models fitted to it and a catcher of export
+// errors, shared by the export tests and benchmark.
 #ifndef VELTMARQUIST_EXPORTTESTFORM_H
 #define VELTMARQUIST_EXPORTTESTFORM_H
 
-#include "MeasurementFile.h"
+#include "ChartLayouts.h"
 #include "models/PrintModels.h"
 
-#include <string>
+#include <fstream>
+#include <functional>
 
 namespace exporttest {
 
+using namespace veltmarquist;
+
 const std::string kFormPath = VELTMARQUIST_SAMPLES_DIR "/offset_form.txt";
 
-// samples/offset_form.txt as read by our reader.
-const veltmarquist::MeasurementFile& formFile();
-// Its 46 test-form patches, found by their coverages.
-const veltmarquist::MeasuredForm& measuredForm();
-// A model bound to the form's levels (gravure with its defaults) and one that
-// predicts every coverage (Yule-Nielsen), fitted once.
-const veltmarquist::PrintModel& levelModel();
-const veltmarquist::PrintModel& anyCoverageModel();
-// A file in the temporary folder holding `text`; returns its path.
-std::string temporaryFile(const std::string& name, const std::string& text);
+inline const MeasurementFile& formFile()
+{
+    static const MeasurementFile file = *readMeasurementFile(kFormPath).file;
+    return file;
+}
+
+// The sample holds the 46 patches of the test form in measuring order.
+inline const MeasuredForm& measuredForm()
+{
+    static const MeasuredForm form = [] {
+        std::vector<Spectrum> spectra(MeasuredForm::kPatches);
+        for (size_t patch = 0; patch < spectra.size(); ++patch)
+            for (size_t band = 0; band < kSpectrumBands; ++band)
+                spectra[patch][band] = formFile().sets[patch].reflectance[band] / double(kReflectanceUnits);
+        return MeasuredForm(spectra);
+    }();
+    return form;
+}
+
+// A model bound to the form's levels (gravure, defaults) and one that predicts every coverage.
+inline const PrintModel& levelModel()
+{
+    static const auto model = fitGravureModel(measuredForm(), GravureFactors::defaults);
+    return *model;
+}
+inline const PrintModel& anyCoverageModel()
+{
+    static const auto model = fitYuleNielsenModel(measuredForm());
+    return *model;
+}
+
+inline std::string temporaryFile(const std::string& name, const std::string& text)
+{
+    const std::string path = "/tmp/veltmarquist-export-test-" + name;
+    std::ofstream(path, std::ios::binary) << text;
+    return path;
+}
+
+// "kind: message" of the ExportError that `action` throws; "" when it throws none.
+inline std::string failureOf(const std::function<void()>& action)
+{
+    try {
+        action();
+    } catch (const exporting::ExportError& error) {
+        return std::to_string(static_cast<int>(error.kind())) + ": " + error.what();
+    }
+    return "";
+}
 
 } // namespace exporttest
 
