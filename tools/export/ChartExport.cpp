@@ -47,7 +47,7 @@ std::string writable(std::string value)
     return value;
 }
 
-class Header {
+class KeywordList {
 public:
     void add(const std::string& name, const std::string& value)
     {
@@ -80,7 +80,7 @@ std::string fittedValueText(const FittedValue& value)
     return writable(text);
 }
 
-void addHeader(Header& header, const PrintModel& model, const FormProvenance& form, const PatchLayout& layout,
+void addHeader(KeywordList& header, const PrintModel& model, const FormProvenance& form, const PatchLayout& layout,
                const ExportOptions& options)
 {
     const std::string* formDescriptor = formKeyword(form, "DESCRIPTOR");
@@ -189,7 +189,7 @@ std::string exportChart(const PrintModel& model, const FormProvenance& form, con
 
     cgats::Document document;
     document.sheetType = options.format == ChartFormat::cti3 ? "CTI3" : "CGATS.17";
-    Header header;
+    KeywordList header;
     addHeader(header, model, form, layout, options);
     document.keywords = header.take();
     document.fields = fieldsOf(options);
