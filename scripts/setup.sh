@@ -7,6 +7,7 @@ packages=(build-essential cmake ninja-build pkg-config
           libgtest-dev libgmock-dev libbenchmark-dev
           liblcms2-dev libcli11-dev
           argyll-ref icc-profiles-free  # real CGATS files the reader tests read
+          argyll  # colprof, profcheck, xicclu, spec2cie: profiles from the export (stage 60-profile)
           clang libclang-rt-14-dev valgrind python3
           llvm-14)  # llvm-symbolizer: sanitizer reports with file and line
 

@@ -1,0 +1,48 @@
+#!/usr/bin/env bash
+# Builds ICC output profiles with Debian's argyll from the tool's CTI3
+# exports, as a user would:
+# - the bundled sample form: the grid export (with an ink limit) through
+#   colprof, and profcheck shows that the profile reproduces its own chart;
+#   colprof also takes the export of the library's 900-patch chart;
+# - the real offset data set in ../shared/data, when it is there: profiles from
+#   the grid exports of the offset and the Yule-Nielsen model, each checked
+#   against every measured patch of the file (profile_accuracy.py) and failed
+#   above the accuracy the export is known to reach.
+set -euo pipefail
+cd "$(dirname "$0")/../.."
+
+build=${VELTMARQUIST_STAGE_BUILD:-build/dev} # the dev preset's build unless told otherwise
+[ -f "$build/CMakeCache.txt" ] || cmake --preset dev >/dev/null
+cmake --build "$build" --target veltmarquist >/dev/null
+tool="$build/tools/veltmarquist"
+work=$(mktemp -d)
+trap 'rm -rf "$work"' EXIT
+
+# colprof BASE makes BASE.icc from BASE.ti3; -qm is its default quality.
+profile() { colprof -v0 -qm -D "$(basename "$1")" "$1" >"$1.colprof.log" 2>&1 || { cat "$1.colprof.log"; exit 1; }; }
+
+"$tool" chart samples/offset_form.txt -o "$work/sample-grid.ti3" --format cti3 --layout grid --ink-limit 300 >/dev/null
+profile "$work/sample-grid"
+# The profile's forward table against the 6,561 points it was made from:
+# about 0.1 mean and 0.5 max CIEDE2000 (colprof smooths; it does not interpolate).
+check=$(profcheck -k "$work/sample-grid.ti3" "$work/sample-grid.icc" | grep 'errors(CIEDE2000)')
+echo "sample form, grid: profcheck $check"
+awk -v line="$check" 'BEGIN { split(line, f, /[=,]/); exit !(f[3] + 0 <= 1.0 && f[5] + 0 <= 0.2) }' ||
+  { echo "the sample form's profile is above 1.0 max or 0.2 mean CIEDE2000 on its own chart"; exit 1; }
+
+"$tool" chart samples/offset_form.txt -o "$work/sample-chart.ti3" --format cti3 --layout chart >/dev/null
+colprof -v0 -ql -D sample-chart "$work/sample-chart" >"$work/chart.log" 2>&1 || { cat "$work/chart.log"; exit 1; }
+echo "sample form, chart layout: colprof took the 900-patch export"
+
+data=../shared/data/APTEC_PC10_CardBoard_2023_v1_Spectral.txt
+if [ ! -f "$data" ]; then
+  echo "skipped: profile accuracy on measured data: no evaluation data set at $data (the real press data set is not beside the project)"
+  exit 0
+fi
+# Offset: today's route (the 900-patch chart) reaches 0.98 mean and 6.5 max.
+"$tool" chart "$data" -o "$work/offset-grid.ti3" --format cti3 --layout grid >/dev/null
+profile "$work/offset-grid"
+/usr/bin/python3 scripts/profile_accuracy.py "$work/offset-grid.icc" "$data" --max-mean 0.92 --max-max 4.0
+"$tool" chart "$data" -o "$work/ynsn-grid.ti3" --model ynsn --format cti3 --layout grid >/dev/null
+profile "$work/ynsn-grid"
+/usr/bin/python3 scripts/profile_accuracy.py "$work/ynsn-grid.icc" "$data" --max-mean 0.80 --max-max 3.3
