@@ -191,7 +191,7 @@ VELTMARQUIST_API int DescribePrintModel(const void *model, const char **name, in
                                         const double **levels, int *levelCount);
 
 /* Fitted value `index` (0 to valueCount - 1), for display: its name (for
- * example "coverage limit (%)"), its numbers (count of them, null when
+ * example "gray difference factor (C, M, Y, K)"), its numbers (count of them, null when
  * there are none) and its text (the gravure ink order, a warning; "" when
  * there is none). Any output pointer may be null; what they receive stays
  * valid until the model is destroyed. Status 7 for a null model or an index

@@ -76,7 +76,7 @@ public:
     OffsetModel(const FormPatches& form, const double factor[4], double limit)
         : PrintModel("offset",
                      {{"gray difference factor (C, M, Y, K)", {factor[0], factor[1], factor[2], factor[3]}, ""},
-                      {"coverage limit (%)", {limit}, ""}},
+                      {"full correction at other inks' coverage (%)", {limit}, ""}},
                      formLevels()),
           limit_(limit)
     {

@@ -164,6 +164,15 @@ TEST(CommandLine, EveryCommandEqualsTheLibrarysCharts)
         expectSuccess(run, dir.path("c.txt"), golden);
         EXPECT_TRUE(contains(run.out, printed)) << run.out;
     }
+    // A chart for profile builders: the grid of the form's levels, read back by our reader.
+    expectSuccess(runTool({"chart", "form.txt", "-o", "c.ti3", "--format", "cti3", "--layout", "grid", "--ink-limit", "300"},
+                          dir.dir()));
+    const auto grid = readMeasurementText(ts::readFile(dir.path("c.ti3")));
+    ASSERT_TRUE(grid.ok()) << grid.error.describe();
+    EXPECT_EQ(grid.file->fileType, "CTI3");
+    EXPECT_EQ(grid.file->sets.size(), 6561u);
+    EXPECT_EQ(grid.file->keyword("TOTAL_INK_LIMIT"), "300");
+    std::filesystem::remove(dir.path("c.ti3"));
     // The 46-step charts, measured and modelled, land in the current folder.
     const ToolRun run = runTool({"compare", "form.txt", "--process", "gravure"}, dir.dir());
     expectSuccess(run, dir.path("form.measured46.txt"), "offset-form.c46-measured.chart");
@@ -219,7 +228,8 @@ TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
     layout.fields[10] = "SPECTRAL_NM435";
     const std::pair<const char*, std::string> inputs[] = {
         {"short.txt", missing.text()}, {"twice.txt", duplicate.text()}, {"layout.txt", layout.text()},
-        {"junk.txt", "Report of 12 March\nall good\n"}, {"form7.txt", multiChannelForm(7)}, {"keep.txt", "old chart\n"}};
+        {"junk.txt", "Report of 12 March\nall good\n"}, {"form7.txt", multiChannelForm(7)}, {"keep.txt", "old chart\n"},
+        {"form.txt", goldenForm("offset-form.in").text()}};
     for (const auto& [name, text] : inputs)
         std::ofstream(dir.path(name)) << text;
     const std::tuple<Row, int, const char*> cases[] = {
@@ -235,6 +245,10 @@ TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
         {{"chrat", "form7.txt"}, 2, "unknown command 'chrat'; commands: chart, compare, multichannel, convert"},
         {{"chart", "keep.txt", "-o", "./keep.txt"}, 2, "./keep.txt: is the same file as the input keep.txt"},
         {{"compare", "keep.txt", "--model", "ynsn", "--fit-gravure"}, 2, "--fit-gravure chooses among the library's"},
+        {{"chart", "form.txt", "-o", "out.txt", "--spectral"}, 2, "--spectral needs a chart for profile builders"},
+        {{"chart", "form.txt", "-o", "out.txt", "--layout", "grid:11"}, 2,
+         "sample 4 (C 0 M 0 Y 0 K 30) has K 30, which the offset model cannot predict: it predicts only the form's "
+         "levels 0, 10, 20, 40, 60, 70, 80, 90, 100 %"},
         // Control characters from a path or a file are shown escaped.
         {{"chart", "in\x1b[2J\t.txt", "-o", "out.txt"}, 3, "in\\x1b[2J\\t.txt: cannot open"},
     };
@@ -243,7 +257,7 @@ TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
         EXPECT_TRUE(run.exitCode == exitCode && run.err.rfind("veltmarquist: error: ", 0) == 0 &&
                     contains(run.err, message) && std::count(run.err.begin(), run.err.end(), '\n') == 1)
             << run.exitCode << " " << run.err;
-        EXPECT_EQ(files(dir.dir()), 6) << message << ": a file was left behind";
+        EXPECT_EQ(files(dir.dir()), 7) << message << ": a file was left behind";
     }
     EXPECT_EQ(ts::readFile(dir.path("keep.txt")), "old chart\n");
     const ToolRun help = runTool({"chart", "--help"}, dir.dir()); // documents the exit codes

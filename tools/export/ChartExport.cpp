@@ -127,15 +127,36 @@ std::vector<std::string> fieldsOf(const ExportOptions& options)
     return fields;
 }
 
-void appendNumbers(std::vector<std::string>& row, const double* values, int count, const PatchLayout& layout,
-                   std::size_t patch)
+void requireFinite(const double* values, int count, const PatchLayout& layout, std::size_t patch)
 {
-    for (int i = 0; i < count; ++i) {
+    for (int i = 0; i < count; ++i)
         if (!std::isfinite(values[i]))
             throw ExportError(ExportError::Kind::Calculation,
                               "the model predicted a value that is not a number for " + layout.describePatch(patch));
+}
+
+void appendNumbers(std::vector<std::string>& row, const double* values, int count, const PatchLayout& layout,
+                   std::size_t patch)
+{
+    requireFinite(values, count, layout, patch);
+    for (int i = 0; i < count; ++i)
         row.push_back(roundTripText(values[i]));
-    }
+}
+
+// The library's own XYZ chart of the layout's patches, numbered from 1 (a
+// file layout's SAMPLE_IDs do not survive: the format has no place for them),
+// written by the library's writer from the model's predictions.
+std::string libraryChartText(const PrintModel& model, const PatchLayout& layout)
+{
+    const std::size_t count = layout.size();
+    std::vector<Cmyk> coverages(count);
+    std::vector<Triple> XYZ(count);
+    for (std::size_t patch = 0; patch < count; ++patch)
+        std::copy_n(&layout.cmyk[4 * patch], 4, coverages[patch].begin());
+    model.predict(count, layout.cmyk.data(), nullptr, XYZ.front().data(), nullptr);
+    for (std::size_t patch = 0; patch < count; ++patch)
+        requireFinite(XYZ[patch].data(), 3, layout, patch);
+    return xyzChartText(coverages, XYZ);
 }
 
 } // namespace
@@ -173,15 +194,24 @@ std::string createdNow()
     return text;
 }
 
-std::string exportChart(const PrintModel& model, const FormProvenance& form, const PatchLayout& layout,
-                        const ExportOptions& options)
+void checkOptions(const ExportOptions& options)
 {
-    if (options.format == ChartFormat::library)
-        throw ExportError(ExportError::Kind::Usage, "the library writes its own chart format; the export writes cti3 and cgats");
+    if (options.format == ChartFormat::library && (options.spectral || options.inkLimit))
+        throw ExportError(ExportError::Kind::Usage, std::string(options.spectral ? "--spectral" : "--ink-limit") +
+                                                        " needs a chart for profile builders: --format cti3 or cgats");
     if (options.inkLimit && !(*options.inkLimit > 0.0 && *options.inkLimit <= 400.0))
         throw ExportError(ExportError::Kind::Usage,
                           "the total ink limit is a percentage above 0 and at most 400, not " + roundTripText(*options.inkLimit));
+}
+
+std::string exportChart(const PrintModel& model, const FormProvenance& form, const PatchLayout& layout,
+                        const ExportOptions& options)
+{
+    checkOptions(options);
     checkPredictable(layout, model);
+
+    if (options.format == ChartFormat::library)
+        return libraryChartText(model, layout);
 
     const std::size_t count = layout.size();
     std::vector<double> spectra(options.spectral ? count * kSpectrumBands : 0), XYZ(count * 3), Lab(count * 3);

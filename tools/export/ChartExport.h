@@ -10,7 +10,8 @@
 // The tool's chart command and the Python package both call exportChart, so
 // the same model, form, layout and options give the same bytes. Writing the
 // text to disk (atomically) is the caller's part. The library's own chart
-// format is not made here: the library writes it (CalculateChart).
+// format comes from the library's own writer (xyzChartText), which gives the
+// bytes of CalculateChart for the library's models.
 #ifndef VELTMARQUIST_EXPORT_CHARTEXPORT_H
 #define VELTMARQUIST_EXPORT_CHARTEXPORT_H
 
@@ -25,7 +26,7 @@
 namespace veltmarquist::exporting {
 
 enum class ChartFormat {
-    library, // the library's 900-patch XYZ chart, written by CalculateChart
+    library, // the library's XYZ chart layout (of any layout's patches), by the library's writer
     cti3,    // CGATS with sheet type CTI3, DEVICE_CLASS and COLOR_REP, as profile builders read it
     cgats    // plain CGATS.17 with the same fields
 };
@@ -51,14 +52,20 @@ struct ExportOptions {
 // that builds can repeat a file byte for byte.
 std::string createdNow();
 
+// Refuses options that do not go together (ExportError::Kind::Usage): spectra
+// or an ink limit with the library format, an ink limit outside (0, 400] %.
+void checkOptions(const ExportOptions& options);
+
 // The chart of `layout` predicted by `model`, as CGATS text (LF line ends).
 // Fields SAMPLE_ID, CMYK_C..CMYK_K, XYZ_X..XYZ_Z (D50, 2 degree, 0..100, not
 // limited to Y = 100), LAB_L..LAB_B, and with `spectral` the 36 bands as
 // SPEC_380..SPEC_730 in percent (CTI3, SPECTRAL_NORM 100) or as reflectance
 // factors 0..1 in SPECTRAL_NM380..SPECTRAL_NM730 (CGATS).
 // Every number is the shortest text that reads back as the same double.
-// Throws ExportError: Usage for the library format or an ink limit out of
-// range, NotPredicted for a coverage the model does not predict,
+// The library format writes the library's XYZ chart layout instead (Y limited,
+// cut to two decimals, patches numbered from 1).
+// Throws ExportError: Usage for spectra or an ink limit with the library
+// format or an ink limit out of range, NotPredicted for a coverage the model does not predict,
 // Calculation for a value that is not finite.
 std::string exportChart(const PrintModel& model, const FormProvenance& form, const PatchLayout& layout,
                         const ExportOptions& options);

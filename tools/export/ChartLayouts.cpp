@@ -138,9 +138,13 @@ PatchLayout fileLayout(const MeasurementFile& file, const std::string& name)
         for (double percent : set.devicePercent())
             layout.cmyk.push_back(std::clamp(percent, 0.0, 100.0)); // the reader lets -0.05..100.05 % pass as noise
     }
-    for (const std::string& warning : file.warnings)
-        layout.warnings.push_back(name + ": " + warning);
+    layout.warnings = file.warnings;
     return layout;
+}
+
+bool isGeneratedLayout(const std::string& argument)
+{
+    return argument == "chart" || argument == "grid" || argument.rfind("grid:", 0) == 0;
 }
 
 PatchLayout readLayout(const std::string& argument)

@@ -48,7 +48,7 @@ struct PatchLayout {
     std::vector<std::string> ids;      // the SAMPLE_ID of each patch
     std::vector<double> cmyk;          // C, M, Y, K in percent, four per patch
     std::vector<int> lines;            // each patch's line in its file; empty for generated layouts
-    std::vector<std::string> warnings; // the layout file's reader warnings, one line each
+    std::vector<std::string> warnings; // the layout file's reader warnings, one line each, without its name
 
     std::size_t size() const { return ids.size(); }
     // "sample 17 (C 0 M 30 Y 0 K 0)", or "ECI2002.ti2: sample A12 (line 40)" for a file's patch.
@@ -78,6 +78,10 @@ PatchLayout gridLayout(const std::vector<double>& levels, const std::string& des
 // SAMPLE_NAMEs, else the set's number counted from 1). `name` is how
 // messages name the file.
 PatchLayout fileLayout(const MeasurementFile& file, const std::string& name);
+
+// True for the words that name generated layouts: "chart", "grid", "grid:..."
+// (a malformed grid:N is still no file name).
+bool isGeneratedLayout(const std::string& argument);
 
 // "chart", "grid", "grid:N" (N from 2 to 21) or the path of a CGATS file.
 // The three words win over files of that name: write ./grid for a file

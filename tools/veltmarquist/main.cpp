@@ -159,10 +159,26 @@ int main(int argc, char** argv)
 
     ChartOptions chart;
     CLI::App* chartCommand = app.add_subcommand(
-        "chart", "900-patch characterisation chart (XYZ) from a measured four-colour test form");
+        "chart", "characterisation chart (XYZ) from a measured four-colour test form: the library's 900 patches, "
+                 "or a grid or target for profile builders");
     chartCommand->add_option("FORM", chart.form, "measurement file with the 46 test-form patches (any order)")
         ->required();
     chartCommand->add_option("-o,--output", chart.output, "chart file to write")->required();
+    chartCommand
+        ->add_option("--format", chart.format,
+                     "library: the library's own XYZ chart; cti3: for profile builders (CTI3, XYZ and Lab in full "
+                     "precision); cgats: the same fields as plain CGATS.17")
+        ->check(CLI::IsMember({"library", "cti3", "cgats"}))
+        ->capture_default_str();
+    chartCommand
+        ->add_option("--layout", chart.layout,
+                     "chart: the library's 900 combinations; grid: every combination of the form's 9 levels (6561); "
+                     "grid:N: N even levels per ink (--model ynsn); FILE: the device values of a CGATS target")
+        ->capture_default_str();
+    chartCommand->add_flag("--spectral", chart.spectral, "also write the predicted spectra, 380-730 nm (cti3, cgats)");
+    chartCommand->add_option("--ink-limit", chart.inkLimit,
+                             "write TOTAL_INK_LIMIT PERCENT for the profile builder's separations (cti3, cgats); "
+                             "removes no patch");
     chartCommand->add_option("--process", processName, "print model")
         ->check(CLI::IsMember({"offset", "gravure"}))
         ->capture_default_str();

@@ -1,10 +1,12 @@
-// chart: the 900-patch characterisation chart of a four-colour process, and
-// its check against what the form measured beyond the test form.
+// chart: the characterisation chart of a four-colour process, and its check
+// against what the form measured beyond the test form.
 //
-// The library's processes 0 and 1 write their chart through CalculateChart,
-// as every host gets it; the Yule-Nielsen model's predictions go through the
-// library's own XYZ chart writer. The numbers of the check come from the
-// fitted model, as the chart holds them (Y limited, cut to two decimals).
+// The library's 900-patch chart of processes 0 and 1 is written through
+// CalculateChart, as every host gets it; every other chart (the Yule-Nielsen
+// model's, another layout, a format for profile builders) is the export's
+// text of the model's predictions, which the Python package writes too. The
+// numbers of the check come from the fitted model, as the library's chart
+// holds them (Y limited, cut to two decimals), whatever the export holds.
 #include "Commands.h"
 
 #include "FourColourForm.h"
@@ -12,6 +14,9 @@
 #include "LibraryBlock.h"
 #include "LibraryHost.h"
 #include "OutputFile.h"
+#include "ToolError.h"
+
+#include "ChartExport.h"
 
 namespace veltmarquist {
 
@@ -28,6 +33,30 @@ void writeLibraryChart(const ChartOptions& options, const FoundForm& form, const
     profile.calculate(options.process, output, block);
 }
 
+Failure failureOf(exporting::ExportError::Kind kind, bool fromFile)
+{
+    using Kind = exporting::ExportError::Kind;
+    switch (kind) {
+    case Kind::Unreadable: return Failure::InputUnreadable;
+    case Kind::Syntax: return Failure::InputSyntax;
+    case Kind::Content: return Failure::InputContent;
+    case Kind::NotPredicted: return fromFile ? Failure::InputContent : Failure::Usage;
+    case Kind::Calculation: return Failure::Calculation;
+    default: return Failure::Usage;
+    }
+}
+
+// Runs a step of the export; its failures become the tool's.
+template <typename Step>
+auto exportStep(const std::string& layout, Step step)
+{
+    try {
+        return step();
+    } catch (const exporting::ExportError& error) {
+        throw ToolError(failureOf(error.kind(), !exporting::isGeneratedLayout(layout)), error.what());
+    }
+}
+
 std::vector<CheckedPatch> onChart(const std::vector<CheckedPatch>& patches)
 {
     std::vector<CheckedPatch> chart;
@@ -41,17 +70,47 @@ std::vector<CheckedPatch> onChart(const std::vector<CheckedPatch>& patches)
 
 void runChart(const ChartOptions& options, ChartResult& result)
 {
-    refuseClashingOutputs({options.form}, {options.output});
+    const bool layoutFromFile = !exporting::isGeneratedLayout(options.layout);
+    std::vector<std::string> inputs{options.form};
+    if (layoutFromFile)
+        inputs.push_back(options.layout);
+    refuseClashingOutputs(inputs, {options.output});
+    exporting::ExportOptions exportOptions;
+    exportOptions.format = exportStep(options.layout, [&] {
+        const auto format = exporting::chartFormatNamed(options.format);
+        if (!format)
+            throw exporting::ExportError(exporting::ExportError::Kind::Usage,
+                                         "unknown chart format '" + options.format + "'; formats: library, cti3, cgats");
+        return *format;
+    });
+    exportOptions.spectral = options.spectral;
+    exportOptions.inkLimit = options.inkLimit;
+    exportStep(options.layout, [&] { exporting::checkOptions(exportOptions); });
+    const bool libraryChart = exportOptions.format == exporting::ChartFormat::library && options.layout == "chart";
+
     result.form = readTestForm(options.form, options.read, result.formWarnings);
     const FoundForm& form = *result.form;
+    const exporting::PatchLayout layout = exportStep(options.layout, [&] { return exporting::readLayout(options.layout); });
+    if (layoutFromFile)
+        result.layoutWarnings = FileWarnings{options.layout, layout.warnings};
     PendingOutput output(options.output);
     FittedModel fit = fitChosenModel(form, options.process, options.fitGravure, options.yuleNielsen);
     const std::vector<Cmyk> chart = characterisationChart();
     std::vector<Triple> predicted = predictXYZ(*fit.model, chart);
-    if (options.yuleNielsen)
-        output.write(xyzChartText(chart, predicted));
-    else
+    if (libraryChart && !options.yuleNielsen) {
         writeLibraryChart(options, form, output);
+    } else {
+        output.write(exportStep(options.layout, [&] {
+            return exporting::exportChart(*fit.model, exporting::provenanceOf(form.file, options.form), layout,
+                                          exportOptions);
+        }));
+    }
+    if (!libraryChart) {
+        result.layout = layout.description;
+        if (exportOptions.format != exporting::ChartFormat::library)
+            result.format = exportOptions.format == exporting::ChartFormat::cti3 ? "CTI3" : "CGATS";
+    }
+    result.patches = layout.size();
     result.fit = std::move(fit);
     result.coverages = chart;
     result.predicted = std::move(predicted);

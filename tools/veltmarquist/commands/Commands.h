@@ -10,19 +10,26 @@
 
 #include "VeltmarquistDLL.h"
 
+#include <optional>
 #include <string>
 
 namespace veltmarquist {
 
-// chart FORM -o CHART: the 900-patch characterisation chart of a four-colour
-// process from the 46 test-form patches: process 0 or 1 of the library, or
-// the Yule-Nielsen model written in the library's layout.
+// chart FORM -o CHART: the characterisation chart of a four-colour process
+// from the 46 test-form patches. By default the library's 900-patch chart:
+// process 0 or 1 of the library, or the Yule-Nielsen model written in the
+// library's layout; --format and --layout export other patches for profile
+// builders.
 struct ChartOptions {
     std::string form;
     std::string output;
     PrintProcess process = VM_PROCESS_OFFSET;
     bool fitGravure = false;  // fit ink order and trapping factors first (gravure only)
     bool yuleNielsen = false; // the Yule-Nielsen model instead of the library's
+    std::string format = "library"; // library, cti3 or cgats
+    std::string layout = "chart";   // chart, grid, grid:N or a CGATS file
+    bool spectral = false;          // also the predicted spectra (cti3, cgats)
+    std::optional<double> inkLimit; // TOTAL_INK_LIMIT in percent (cti3, cgats)
     ReadOptions read;
 };
 void runChart(const ChartOptions& options, ChartResult& result);

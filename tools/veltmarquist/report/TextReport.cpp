@@ -116,7 +116,8 @@ void printModel(const FittedModel& fit, const std::string& formPath, std::ostrea
         out << "offset model fitted to the two greys:\n"
             << "  gray difference factor  C " << number(factor.at(0)) << "  M " << number(factor.at(1)) << "  Y "
             << number(factor.at(2)) << "  K " << number(factor.at(3)) << "\n"
-            << "  coverage limit          " << number(valueNamed(model, "coverage limit").numbers.at(0)) << " %\n";
+            << "  full correction at      " << number(valueNamed(model, "full correction").numbers.at(0))
+            << " % coverage of the other inks (a model value, not an ink limit)\n";
     }
 }
 
@@ -168,10 +169,15 @@ bool printFormAndModel(const FormAndModel& result, std::ostream& out)
 
 void renderChart(const ChartResult& result, std::ostream& out)
 {
+    printWarnings(result.layoutWarnings);
     if (!printFormAndModel(result, out) || result.written.empty())
         return;
-    out << "chart: " << result.coverages.size() << " patches ("
-        << (result.fit->yuleNielsen ? "Yule-Nielsen" : result.fit->name()) << " model) written to " << result.written
+    out << "chart: " << result.patches << " patches (";
+    if (!result.layout.empty())
+        out << result.layout << ", ";
+    if (!result.format.empty())
+        out << result.format << ", ";
+    out << (result.fit->yuleNielsen ? "Yule-Nielsen" : result.fit->name()) << " model) written to " << result.written
         << "\n";
     printCheck(result, out);
 }

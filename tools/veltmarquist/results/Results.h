@@ -49,7 +49,11 @@ struct FormAndModel {
 
 // chart FORM -o CHART
 struct ChartResult : FormAndModel {
-    std::vector<Cmyk> coverages;      // the chart's patches
+    FileWarnings layoutWarnings;      // of a layout read from a file
+    std::string layout;               // empty for the library's chart, else how the export names its patches
+    std::string format;               // empty for the library's format, else "CTI3" or "CGATS"
+    size_t patches = 0;               // written to the chart
+    std::vector<Cmyk> coverages;      // the library's chart's patches, as the check reads them
     std::vector<Triple> predicted;    // their X, Y, Z as the model gives them (the chart limits and cuts them)
     std::string written;              // how messages name the delivered chart; empty until delivered
     // The combinations FORM measured beyond the test form against the
