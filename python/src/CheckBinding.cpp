@@ -1,9 +1,7 @@
 // Checks of a model on measured combinations.
-#include "CheckBinding.h"
+#include "Bindings.h"
 
 #include "Arrays.h"
-#include "MeasurementsBinding.h"
-#include "ModelBinding.h"
 
 #include "PatchMatching.h"
 #include "PredictionCheck.h"
@@ -94,7 +92,7 @@ py::array_t<double> lab(const CheckResult& result, Lab CheckedPatch::*member)
 
 } // namespace
 
-py::object checkModel(const Model& model, const py::handle& measurements)
+py::object checkModel(const Model& model, const py::object& measurements)
 {
     std::shared_ptr<Measurements> other;
     if (!measurements.is_none())

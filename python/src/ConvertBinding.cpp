@@ -1,9 +1,8 @@
 // Chart conversion between paper whites on arrays.
-#include "ConvertBinding.h"
+#include "Bindings.h"
 
 #include "Arrays.h"
-#include "AtomicFile.h"
-#include "LibraryProfile.h"
+#include "OutputFiles.h"
 
 #include "ColourDifference.h"
 #include "Files.h"
@@ -11,6 +10,7 @@
 
 #include "models/PrintModels.h"
 
+#include <pybind11/stl.h>
 #include <pybind11/stl/filesystem.h>
 
 #include <cmath>
@@ -49,8 +49,8 @@ std::vector<double> bandsOf(const std::vector<int>& thousandths)
     return bands;
 }
 
-py::object convertChart(const py::handle& spectraGiven, const py::handle& channelsGiven, const py::handle& fromGiven,
-                        const py::handle& toGiven, const std::string& modeName, const std::filesystem::path& path,
+py::object convertChart(const py::object& spectraGiven, const py::object& channelsGiven, const py::object& fromGiven,
+                        const py::object& toGiven, const std::string& modeName, const std::filesystem::path& path,
                         bool cmykOnly)
 {
     const py::object conversion = py::module_::import("veltmarquist._results").attr("Conversion");

@@ -1,5 +1,5 @@
 // Measurement files as arrays.
-#include "MeasurementsBinding.h"
+#include "Bindings.h"
 
 #include "Arrays.h"
 

@@ -1,10 +1,8 @@
 // Fitting, predicting and charting.
-#include "ModelBinding.h"
+#include "Bindings.h"
 
 #include "Arrays.h"
-#include "AtomicFile.h"
-#include "CheckBinding.h"
-#include "MeasurementsBinding.h"
+#include "OutputFiles.h"
 
 #include "ChartExport.h"
 #include "commands/FourColourForm.h"
@@ -52,7 +50,7 @@ py::object valueOf(const FittedValue& value)
     return vector(value.numbers);
 }
 
-Model fitModel(const py::handle& given, const std::optional<std::string>& name, bool fitGravure,
+Model fitModel(const py::object& given, const std::optional<std::string>& name, bool fitGravure,
                std::optional<double> scale)
 {
     const std::string chosen = name.value_or(fitGravure ? "gravure" : "offset");
@@ -83,7 +81,7 @@ Model fitModel(const py::handle& given, const std::optional<std::string>& name, 
     return model;
 }
 
-py::tuple predict(const Model& model, const py::handle& cmyk)
+py::tuple predict(const Model& model, const py::object& cmyk)
 {
     const py::object prediction = py::module_::import("veltmarquist._results").attr("Prediction");
     const Rows rows(cmyk, 4, "cmyk");
@@ -102,7 +100,7 @@ py::tuple predict(const Model& model, const py::handle& cmyk)
                       rows.shaped(std::move(Lab), 3));
 }
 
-std::size_t writeChart(const Model& model, const std::filesystem::path& path, const py::handle& layoutGiven,
+std::size_t writeChart(const Model& model, const std::filesystem::path& path, const py::object& layoutGiven,
                        const std::string& format, bool spectral, std::optional<double> inkLimit,
                        const std::optional<std::string>& created)
 {

@@ -2,11 +2,7 @@
 // failures as the package's exceptions, and the library's colorimetry on
 // arrays.
 #include "Arrays.h"
-#include "CheckBinding.h"
-#include "ConvertBinding.h"
-#include "MeasurementsBinding.h"
-#include "ModelBinding.h"
-#include "MultiChannelBinding.h"
+#include "Bindings.h"
 
 #include "ChartLayouts.h"
 #include "ColourDifference.h"
@@ -56,7 +52,7 @@ void translate(std::exception_ptr failure)
 
 // A row-wise function of the library's colorimetry on an array.
 template <std::size_t in, std::size_t out, typename Function>
-py::array_t<double> rowWise(const py::handle& values, const char* what, Function function)
+py::array_t<double> rowWise(const py::object& values, const char* what, Function function)
 {
     const Rows rows(values, in, what);
     std::vector<double> results(rows.count() * out);
@@ -68,7 +64,7 @@ py::array_t<double> rowWise(const py::handle& values, const char* what, Function
     return rows.shaped(std::move(results), out);
 }
 
-py::array_t<double> spectraToXYZ(const py::handle& spectra)
+py::array_t<double> spectraToXYZ(const py::object& spectra)
 {
     return rowWise<kSpectrumBands, 3>(spectra, "spectra", [](const double* bands, double* XYZ) {
         Spectrum spectrum;
@@ -79,7 +75,7 @@ py::array_t<double> spectraToXYZ(const py::handle& spectra)
 }
 
 template <Triple (*convert)(const Triple&)>
-py::array_t<double> tripleWise(const py::handle& values, const char* what)
+py::array_t<double> tripleWise(const py::object& values, const char* what)
 {
     return rowWise<3, 3>(values, what, [](const double* given, double* result) {
         const Triple triple = convert({given[0], given[1], given[2]});
@@ -90,7 +86,7 @@ py::array_t<double> tripleWise(const py::handle& values, const char* what)
 // A colour difference between CIELAB rows of two arrays that broadcast
 // against each other; one pair gives a float.
 template <double (*difference)(const Lab&, const Lab&)>
-py::object pairWise(const py::handle& first, const py::handle& second)
+py::object pairWise(const py::object& first, const py::object& second)
 {
     const py::object numpy = py::module_::import("numpy");
     const py::tuple both = numpy.attr("broadcast_arrays")(numpy.attr("asarray")(first, "float64"),
@@ -128,11 +124,11 @@ PYBIND11_MODULE(_veltmarquist, module)
 X, Y, Z (D50, 2 degree, 0-100) of spectra (..., 36: reflectance 0-1 at
 380-730 nm) as the library sums them; Y is not limited to 100.)");
     module.def(
-        "xyz_to_lab", [](const py::handle& XYZ) { return tripleWise<&XYZToLab>(XYZ, "xyz"); }, py::arg("xyz"), R"(
+        "xyz_to_lab", [](const py::object& XYZ) { return tripleWise<&XYZToLab>(XYZ, "xyz"); }, py::arg("xyz"), R"(
 CIELAB of X, Y, Z (..., 3; 0-100) with the ICC D50 white and the library's
 tabulated cube root: the CIELAB of Model.predict.)");
     module.def(
-        "chart_xyz", [](const py::handle& XYZ) { return tripleWise<&chartXYZ>(XYZ, "xyz"); }, py::arg("xyz"), R"(
+        "chart_xyz", [](const py::object& XYZ) { return tripleWise<&chartXYZ>(XYZ, "xyz"); }, py::arg("xyz"), R"(
 X, Y, Z as the library's XYZ charts hold them: limited to Y = 100 (X and Z
 scaled with Y), then cut toward minus infinity at two decimals.)");
     module.def("delta_e_2000", &pairWise<&deltaE2000>, py::arg("lab1"), py::arg("lab2"), R"(

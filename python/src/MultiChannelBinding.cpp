@@ -1,10 +1,8 @@
 // Multi-channel charts from a form and from separations.
-#include "MultiChannelBinding.h"
+#include "Bindings.h"
 
 #include "Arrays.h"
-#include "AtomicFile.h"
-#include "LibraryProfile.h"
-#include "MeasurementsBinding.h"
+#include "OutputFiles.h"
 
 #include "Files.h"
 #include "LibraryBlock.h"
@@ -13,6 +11,7 @@
 
 #include "MathProfile.h"
 
+#include <pybind11/stl.h>
 #include <pybind11/stl/filesystem.h>
 
 #include <cmath>
@@ -34,7 +33,7 @@ struct MultiChannelChart {
     std::mutex busy; // a profile runs one calculation at a time
 };
 
-std::shared_ptr<MultiChannelChart> writeMultiChannelChart(const py::handle& given, int inks,
+std::shared_ptr<MultiChannelChart> writeMultiChannelChart(const py::object& given, int inks,
                                                           const std::filesystem::path& path,
                                                           std::optional<double> scale)
 {
@@ -77,7 +76,7 @@ std::string combinationLabel(size_t record)
            describeDevice({double(cmyk[0]), double(cmyk[1]), double(cmyk[2]), double(cmyk[3])}) + ")";
 }
 
-void writeSeparatedChart(MultiChannelChart& chart, const py::handle& separations, const std::filesystem::path& path)
+void writeSeparatedChart(MultiChannelChart& chart, const py::object& separations, const std::filesystem::path& path)
 {
     // Seven channels map one to one; six inks put ink B on the library's
     // channel 6 (channel 5 stays unprinted), as the six-colour model does.

@@ -1,8 +1,13 @@
 // Files the module writes: each appears under its name only when complete
 // and checked, the way the tool delivers its outputs, but without the tool's
-// signal handlers (Python keeps its own: Ctrl-C is a KeyboardInterrupt).
-#ifndef VELTMARQUIST_PYTHON_ATOMICFILE_H
-#define VELTMARQUIST_PYTHON_ATOMICFILE_H
+// signal handlers (Python keeps its own: Ctrl-C is a KeyboardInterrupt); and
+// the library's profiles, which write the charts that only their processes make.
+#ifndef VELTMARQUIST_PYTHON_OUTPUTFILES_H
+#define VELTMARQUIST_PYTHON_OUTPUTFILES_H
+
+#include "LibraryBlock.h"
+
+#include "VeltmarquistDLL.h"
 
 #include <string>
 
@@ -36,6 +41,23 @@ private:
     bool committed_ = false;
 };
 
+// A profile made by CreateMathProfile; the library destroys it itself after
+// statuses 1 and 3, and the handle never destroys it twice.
+class LibraryProfile {
+public:
+    explicit LibraryProfile(const std::string& name);
+    ~LibraryProfile();
+    LibraryProfile(const LibraryProfile&) = delete;
+    LibraryProfile& operator=(const LibraryProfile&) = delete;
+
+    // CalculateChart into the file's temporary file, which is then checked;
+    // a status other than 0 is a ToolError with the tool's message.
+    void calculate(PrintProcess process, const AtomicFile& output, MeasurementBlock& block);
+
+private:
+    void* handle_;
+};
+
 } // namespace veltmarquist::python
 
-#endif // VELTMARQUIST_PYTHON_ATOMICFILE_H
+#endif // VELTMARQUIST_PYTHON_OUTPUTFILES_H
