@@ -58,6 +58,14 @@ py::list texts(const MeasurementFile& file, std::string MeasurementSet::*member)
     return list;
 }
 
+py::list texts(const std::vector<std::string>& lines, const std::string& prefix = "")
+{
+    py::list list;
+    for (const std::string& line : lines)
+        list.append(text(prefix + line));
+    return list;
+}
+
 } // namespace
 
 ReadOptions readOptions(std::optional<double> scale)
@@ -120,22 +128,10 @@ read_measurements().)")
             },
             "The header keywords and their values, in file order (the first of repeated keywords).")
         .def_property_readonly(
-            "device_fields",
-            [](const Measurements& m) {
-                py::list fields;
-                for (const std::string& field : m.file.deviceFields)
-                    fields.append(text(field));
-                return fields;
-            },
+            "device_fields", [](const Measurements& m) { return texts(m.file.deviceFields); },
             "The device fields, CMYK_C ... CMYK_K or nCLR_1 ... nCLR_n.")
         .def_property_readonly(
-            "warnings",
-            [](const Measurements& m) {
-                py::list warnings;
-                for (const std::string& warning : m.file.warnings)
-                    warnings.append(text(m.path + ": " + warning));
-                return warnings;
-            },
+            "warnings", [](const Measurements& m) { return texts(m.file.warnings, m.path + ": "); },
             "The reader's and the paper's warnings, one line each, as the tool prints them.")
         .def_property_readonly(
             "scale", [](const Measurements& m) { return m.file.scale; },

@@ -74,6 +74,24 @@ void writeAll(const std::string& file, const std::string& text, int flags, const
         unwritable(path, std::string("write failed: ") + std::strerror(failure));
 }
 
+// The file a path names through its symbolic links (a dangling link names
+// the file it would create).
+std::string followLinks(const std::string& path)
+{
+    namespace fs = std::filesystem;
+    fs::path target(path);
+    std::error_code error;
+    for (int depth = 0; depth < 40; ++depth) {
+        if (!fs::is_symlink(target, error))
+            return target.string();
+        const fs::path link = fs::read_symlink(target, error);
+        if (error)
+            return target.string(); // changed under us: the writing will say what is wrong
+        target = link.is_absolute() ? link : target.parent_path() / link;
+    }
+    unwritable(path, "too many levels of symbolic links");
+}
+
 } // namespace
 
 AtomicFile::AtomicFile(std::string path) : path_(std::move(path))
@@ -81,8 +99,7 @@ AtomicFile::AtomicFile(std::string path) : path_(std::move(path))
     namespace fs = std::filesystem;
     if (path_.empty())
         unwritable(path_, "empty output path");
-    std::error_code error;
-    target_ = fs::is_symlink(path_, error) ? fs::weakly_canonical(path_, error).string() : path_;
+    target_ = followLinks(path_);
     struct stat status {};
     const bool exists = ::stat(target_.c_str(), &status) == 0;
     if (exists && S_ISDIR(status.st_mode))

@@ -74,12 +74,13 @@ def cgats_rows(path, first_field):
 def test_multichannel_charts_equal_the_tools(tool, tmp_path, inks):
     form = SAMPLES / {6: "six_ink_form.txt", 7: "seven_ink_form.txt"}[inks]
     chart = veltmarquist.multichannel_chart(form, inks, tmp_path / "python.chart")
-    # A separation software's answer: the C, M, Y, K and three further inks, to a thousandth of a percent.
+    # A separation software's answer: the C, M, Y, K and three further inks, with digits beyond the
+    # thousandth of a percent that the library takes (rounded half away from zero, as from a file).
     record = np.arange(3499)[:, None]
-    further = np.round((record * np.array([7.123, 13.457, 29.001])) % 100, 3)
+    further = np.round((record * np.array([7.1235, 13.4575, 29.0015])) % 100, 4)
     separations = np.hstack([chart.combinations * 0.9, further])[:, :inks if inks == 7 else 6]
     fields = "\t".join(f"{inks}CLR_{channel}" for channel in range(1, separations.shape[1] + 1))
-    rows = "\n".join(f"{i + 1}\t" + "\t".join(f"{v:.3f}" for v in row) for i, row in enumerate(separations))
+    rows = "\n".join(f"{i + 1}\t" + "\t".join(f"{v:.4f}" for v in row) for i, row in enumerate(separations))
     (tmp_path / "separations.txt").write_text(f"CGATS.17\nBEGIN_DATA_FORMAT\nSAMPLE_ID\t{fields}\nEND_DATA_FORMAT\n"
                                               f"BEGIN_DATA\n{rows}\nEND_DATA\n")
     subprocess.run([tool, "multichannel", str(form), "--inks", str(inks), "-o", str(tmp_path / "tool.chart"),
@@ -107,3 +108,17 @@ def test_converted_charts_equal_the_tools(tool, tmp_path, mode):
     assert result.patches == len(patches)
     if mode != "copy":
         assert f"{result.whites_apart:.2f} dE*ab apart" in report
+
+
+# The accuracy the README states for the real sheet-fed offset data set (APTEC PC10):
+# model: (combinations checked, mean, 95th percentile, max CIEDE2000; the same on the chart's combinations)
+REAL_ACCURACY = {"offset": ((720, 1.21, 2.55, 3.75), (720, 1.21, 2.55, 3.75)),
+                 "ynsn": ((1542, 0.78, 1.59, 3.34), (720, 0.89, 1.79, 3.16))}
+
+
+@no_real_data
+@pytest.mark.parametrize("model", REAL_ACCURACY)
+def test_accuracy_on_the_real_data_set(model):
+    check = veltmarquist.fit(REAL_DATA, model=model).check()
+    for summary, expected in zip((check.summary, check.chart_summary), REAL_ACCURACY[model]):
+        assert (summary.count, *(round(value, 2) for value in (summary.mean, summary.p95, summary.max))) == expected
