@@ -36,6 +36,15 @@ def test_measurements_are_the_readers_sets_as_arrays():
     assert len(sheet.sample_ids) == len(sheet)
 
 
+def test_text_that_is_not_utf8_is_kept_escaped(tmp_path):
+    sheet = tmp_path / "latin1.txt"
+    sheet.write_bytes(b'CGATS.17\nDESCRIPTOR "Pr\xe9sse"\nBEGIN_DATA_FORMAT\nSAMPLE_ID SAMPLE_NAME CMYK_C CMYK_M '
+                      b'CMYK_Y CMYK_K\nEND_DATA_FORMAT\nBEGIN_DATA\n1 caf\xe9 0 0 0 0\nEND_DATA\n')
+    measurements = veltmarquist.read_measurements(sheet)
+    assert measurements.sample_names == ["caf\\xe9"]
+    assert measurements.keywords["DESCRIPTOR"] == "Pr\\xe9sse"
+
+
 def test_sixteen_bands_and_files_without_spectra():
     sixteen = veltmarquist.read_measurements(SAMPLES / "offset_form_16band.txt")
     # The library widens 400-700 nm in 20 nm steps: 380-410 nm take the 420 nm value.
@@ -100,6 +109,7 @@ ERRORS = {
                               "predicts only the form's levels 0, 10, 20, 40, 60, 70, 80, 90, 100 %; C 35 is not one"),
     "outside 0-100": (lambda m: m.predict([[0, 0, 0, 0], [0, 100.5, 0, 0]]), ValueError,
                       "patch 1: M 100.5 is not a coverage from 0 to 100 %"),
+    "not a number": (lambda m: m.predict([0, 0, float("nan"), 0]), ValueError, "Y nan is not a coverage"),
     "wrong shape": (lambda m: m.predict([1, 2, 3]), ValueError, "cmyk must hold 4 values per row"),
     "unknown format": (lambda m: m.chart("x", format="icc"), veltmarquist.UsageError, "unknown chart format 'icc'"),
     "grid off the levels": (lambda m: m.chart("x", layout="grid:7"), veltmarquist.UsageError, "predicts only"),
@@ -121,6 +131,11 @@ ERRORS = {
                                 ValueError, "reflectance factors lie from 0 to 1"),
     "a blend without whites": (lambda m: convert(np.zeros((1, 4)), "blend", from_white=None),
                                veltmarquist.UsageError, "mode 'blend' needs both whites"),
+    "a folder for a chart": (lambda m: m.chart("."), veltmarquist.OutputError, ".: is a folder"),
+    "a chart in a missing folder": (lambda m: m.chart("no/chart.txt"), veltmarquist.OutputError,
+                                    "no/chart.txt: cannot create a file in no/"),
+    "a scale for a file already read": (lambda m: veltmarquist.fit(m.form, scale=1), ValueError,
+                                        "scale applies to a file read from a path"),
 }
 
 DUPLICATE = """CGATS.17
@@ -171,6 +186,8 @@ def test_a_failed_chart_leaves_the_existing_file(offset, tmp_path):
     target.chmod(0o640)
     with pytest.raises(veltmarquist.UsageError):
         offset.chart(target, format="library", spectral=True)
+    offset.chart(target, layout="grid:2", format="cgats", created="2025-01-02T03:04:05Z")
+    assert 'CREATED\t"2025-01-02T03:04:05Z"' in target.read_text()
     offset.chart(target)
     assert oct(target.stat().st_mode & 0o777) == oct(0o640)
     assert sorted(os.listdir(tmp_path)) == ["chart.txt"]
@@ -187,6 +204,21 @@ def test_outputs_follow_links_and_write_into_devices(offset, tmp_path):
     assert (tmp_path / "charts" / "chart.txt").read_text().endswith("END_DATA\n")
     assert offset.chart("/dev/null", layout="grid") == 6561
     assert sorted(os.listdir(tmp_path / "charts")) == ["chart.txt"]
+
+
+def test_one_multichannel_chart_separates_in_two_threads(tmp_path):
+    chart = veltmarquist.multichannel_chart(SAMPLES / "seven_ink_form.txt", 7, tmp_path / "chart.txt")
+    answers = [np.hstack([chart.combinations, np.full((3499, 3), share)]) for share in (0.0, 50.0)]
+    for index, separations in enumerate(answers):
+        chart.separated_chart(separations, tmp_path / f"serial{index}.txt")
+    threads = [threading.Thread(target=chart.separated_chart, args=(separations, tmp_path / f"threads{index}.txt"))
+               for index, separations in enumerate(answers) for _ in range(3)]
+    for thread in threads:
+        thread.start()
+    for thread in threads:
+        thread.join()
+    for index in range(len(answers)):
+        assert (tmp_path / f"threads{index}.txt").read_bytes() == (tmp_path / f"serial{index}.txt").read_bytes()
 
 
 def test_two_models_fit_and_predict_in_two_threads(offset, ynsn):

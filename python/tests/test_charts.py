@@ -56,6 +56,12 @@ def test_four_colour_charts_and_checks_equal_the_tools(tool, tmp_path, monkeypat
     model = veltmarquist.fit(form, **fitting)
     model.chart(tmp_path / "python.txt", **charting)
     assert (tmp_path / "python.txt").read_bytes() == (tmp_path / "tool.txt").read_bytes()
+    if model.name == "offset":
+        factor = model.gray_difference_factor
+        assert f"C {factor[0]:g}  M {factor[1]:g}  Y {factor[2]:g}  K {factor[3]:g}" in report
+        assert f"full correction at      {model.full_correction:g} %" in report
+    if model.name == "gravure":
+        assert f"ink order               {model.ink_order} (" in report
     check = model.check()
     if len(check):
         assert str(check) in report
