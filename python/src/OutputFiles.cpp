@@ -115,7 +115,9 @@ AtomicFile::AtomicFile(std::string path) : path_(std::move(path))
         return;
     }
     const std::string folder = target.has_parent_path() ? target.parent_path().string() + "/" : "";
-    temporary_ = createTemporary(folder, target.filename().string(), path_);
+    // A name too long to take the temporary suffix gives its place to the tool's.
+    const std::string name = target.filename().string();
+    temporary_ = createTemporary(folder, name.size() > 200 ? "veltmarquist" : name, path_);
     if (exists)
         ::chmod(temporary_.c_str(), status.st_mode & 07777);
 }
