@@ -1,0 +1,55 @@
+// numpy arrays in and out of the module, and text from files as Python str.
+#ifndef VELTMARQUIST_PYTHON_ARRAYS_H
+#define VELTMARQUIST_PYTHON_ARRAYS_H
+
+#include <pybind11/numpy.h>
+#include <pybind11/pybind11.h>
+
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <vector>
+
+namespace veltmarquist::python {
+
+namespace py = pybind11;
+
+// Any array-like of numbers as C-ordered doubles.
+using Doubles = py::array_t<double, py::array::c_style | py::array::forcecast>;
+
+// Rows of `columns` values from an array whose last axis has that length:
+// one row (shape (columns,)), N rows (N, columns) or more leading axes. The
+// results of a row-wise function take the same leading axes.
+class Rows {
+public:
+    // Throws ValueError naming `what` for another last axis.
+    Rows(const py::handle& array, std::size_t columns, const char* what);
+    std::size_t count() const { return count_; }
+    bool single() const { return leading_.empty(); } // one row without a first axis
+    const double* data() const { return values_.data(); }
+    const double* row(std::size_t index) const { return values_.data() + index * columns_; }
+    // An array of `columns` doubles per row in the shape of these rows.
+    py::array_t<double> shaped(std::vector<double> values, std::size_t columns) const;
+
+private:
+    std::vector<double> values_;
+    std::vector<py::ssize_t> leading_;
+    std::size_t columns_ = 0, count_ = 0;
+};
+
+// A rows x columns array that owns `values` (no copy), read-only.
+py::array_t<double> matrix(std::vector<double> values, std::size_t rows, std::size_t columns);
+py::array_t<double> vector(std::vector<double> values);
+
+// Text from a file or the library as str: bytes that are not UTF-8 are kept
+// as \xHH escapes instead of failing.
+py::str text(const std::string& bytes);
+
+// A value given in percent or reflectance, to the nearest millionth as the
+// reader keeps file values, then to 1/`per` of the unit half away from zero
+// (the library's thousandths, or whole percent), as the tool rounds file values.
+std::int64_t roundedUnits(double value, std::int64_t per);
+
+} // namespace veltmarquist::python
+
+#endif // VELTMARQUIST_PYTHON_ARRAYS_H

@@ -1,0 +1,222 @@
+// Fitting, predicting and charting.
+#include "Bindings.h"
+
+#include "Arrays.h"
+#include "OutputFiles.h"
+
+#include "ChartExport.h"
+#include "commands/FourColourForm.h"
+#include "ToolError.h"
+
+#include <pybind11/stl.h>
+#include <pybind11/stl/filesystem.h>
+
+#include <cctype>
+#include <filesystem>
+#include <optional>
+#include <stdexcept>
+#include <string>
+
+namespace veltmarquist::python {
+
+namespace {
+
+// "gray difference factor (C, M, Y, K)" -> "gray_difference_factor": the
+// words before the parenthesis, lower case, joined by underscores.
+std::string attributeName(const std::string& name)
+{
+    std::string attribute;
+    for (char c : name.substr(0, name.find(" ("))) {
+        if (std::isalnum(static_cast<unsigned char>(c)))
+            attribute += static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+        else if (!attribute.empty() && attribute.back() != '_')
+            attribute += '_';
+    }
+    while (!attribute.empty() && attribute.back() == '_')
+        attribute.pop_back();
+    if (attribute == "full_correction_at_other_inks_coverage")
+        return "full_correction";
+    if (attribute == "grey_de_ab")
+        return "grey_delta_e_ab";
+    return attribute;
+}
+
+py::object valueOf(const FittedValue& value)
+{
+    if (value.numbers.empty())
+        return text(value.text);
+    if (value.numbers.size() == 1)
+        return py::float_(value.numbers[0]);
+    return vector(value.numbers);
+}
+
+Model fitModel(const py::object& given, const std::optional<std::string>& name, bool fitGravure,
+               std::optional<double> scale)
+{
+    const std::string chosen = name.value_or(fitGravure ? "gravure" : "offset");
+    if (chosen != "offset" && chosen != "gravure" && chosen != "ynsn")
+        throw ToolError(Failure::Usage, "unknown model '" + chosen + "'; models: offset, gravure, ynsn");
+    if (fitGravure && chosen != "gravure")
+        throw ToolError(Failure::Usage, "fit_gravure fits the gravure model; it cannot go with model='" + chosen + "'");
+    Model model;
+    const std::shared_ptr<Measurements> measurements = measurementsOf(given, scale);
+    model.form = py::cast(measurements);
+    {
+        py::gil_scoped_release released;
+        auto found = std::make_shared<FoundForm>(findTestForm(measurements->file, measurements->path));
+        model.fit = fitChosenModel(*found, chosen == "gravure" ? VM_PROCESS_GRAVURE : VM_PROCESS_OFFSET, fitGravure,
+                                   chosen == "ynsn");
+        model.found = std::move(found);
+    }
+    py::list warnings;
+    for (const FittedValue& value : model.fit.model->fittedValues()) {
+        if (value.name == "warning") {
+            warnings.append(text(value.text));
+            continue;
+        }
+        model.values[text(value.name)] = valueOf(value);
+        model.attributes[text(attributeName(value.name))] = valueOf(value);
+    }
+    model.attributes["warnings"] = warnings;
+    return model;
+}
+
+py::tuple predict(const Model& model, const py::object& cmyk)
+{
+    const py::object prediction = py::module_::import("veltmarquist._results").attr("Prediction");
+    const Rows rows(cmyk, 4, "cmyk");
+    std::vector<double> spectra(rows.count() * kSpectrumBands), XYZ(rows.count() * 3), Lab(rows.count() * 3);
+    try {
+        py::gil_scoped_release released;
+        model.fit.model->predict(rows.count(), rows.data(), spectra.data(), XYZ.data(), Lab.data());
+    } catch (const std::invalid_argument& refusal) {
+        // One coverage was given: its refusal needs no patch number.
+        const std::string message = refusal.what(), patch = "patch 0: ";
+        throw py::value_error(rows.single() && message.rfind(patch, 0) == 0
+                                  ? message.substr(patch.size())
+                                  : message);
+    }
+    return prediction(rows.shaped(std::move(spectra), kSpectrumBands), rows.shaped(std::move(XYZ), 3),
+                      rows.shaped(std::move(Lab), 3));
+}
+
+std::size_t writeChart(const Model& model, const std::filesystem::path& path, const py::object& layoutGiven,
+                       const std::string& format, bool spectral, std::optional<double> inkLimit,
+                       const std::optional<std::string>& created)
+{
+    using exporting::ExportError;
+    const std::string layoutName = py::isinstance<py::str>(layoutGiven)
+                                       ? layoutGiven.cast<std::string>()
+                                       : layoutGiven.cast<std::filesystem::path>().string();
+    exporting::ExportOptions options;
+    const auto named = exporting::chartFormatNamed(format);
+    if (!named)
+        throw ExportError(ExportError::Kind::Usage,
+                          "unknown chart format '" + format + "'; formats: library, cti3, cgats");
+    options.format = *named;
+    options.spectral = spectral;
+    options.inkLimit = inkLimit;
+    options.created = created.value_or("");
+    py::gil_scoped_release released;
+    exporting::checkOptions(options);
+    const exporting::PatchLayout layout = exporting::readLayout(layoutName);
+    AtomicFile output(path.string());
+    try {
+        output.write(exporting::exportChart(*model.fit.model, exporting::provenanceOf(model.found->file,
+                                                                                        model.found->path),
+                                            layout, options));
+    } catch (const ExportError& error) {
+        // As the tool: a generated layout off the model's levels is a bad
+        // argument, a file's patch off them bad content.
+        if (error.kind() != ExportError::Kind::NotPredicted)
+            throw;
+        throw ToolError(exporting::isGeneratedLayout(layoutName) ? Failure::Usage : Failure::InputContent,
+                        error.what());
+    }
+    output.commit();
+    return layout.size();
+}
+
+} // namespace
+
+void bindModel(py::module_& module)
+{
+    py::class_<Model, std::shared_ptr<Model>>(module, "Model", R"(
+A four-colour print model fitted to the 46-patch test form of a measurement
+file, as the tool's chart command fits it. Immutable: predict() may run in
+several threads at once (it releases the GIL).
+
+Each fitted value is an attribute (gray_difference_factor, full_correction;
+ink_order, trapping_factors; yule_nielsen_n, ink_spreading, dot_area_c ...,
+tint_residual_rms, grey_delta_e_ab, warnings) and an entry of fitted_values
+under the library's name. Make one with fit().)")
+        .def_property_readonly(
+            "name", [](const Model& m) { return std::string(m.fit.name()); }, "'offset', 'gravure' or 'ynsn'.")
+        .def_readonly("form", &Model::form, "The Measurements the model was fitted to.")
+        .def_readonly("fitted_values", &Model::values, "The fitted values under the library's names.")
+        .def_property_readonly(
+            "levels",
+            [](const Model& m) -> py::object {
+                if (m.fit.model->levels().empty())
+                    return py::none();
+                return vector(m.fit.model->levels());
+            },
+            "The coverages (the same for each ink) the model predicts, or None for every coverage 0-100 %.")
+        .def("predict", &predict, py::arg("cmyk"), R"(
+Predicts coverages: cmyk is one row (C, M, Y, K in percent) or an N x 4 array.
+
+Returns Prediction(spectra, xyz, lab): reflectance at 380-730 nm (N x 36),
+XYZ (D50, 2 degree, 0-100, Y not limited) and the library's CIELAB (N x 3);
+one row gives arrays without the first axis. A coverage that is not finite,
+lies outside 0-100 % or (offset and gravure) is none of the form's levels
+raises ValueError, and nothing is predicted.)")
+        .def("chart", &writeChart, py::arg("path"), py::arg("layout") = "chart", py::arg("format") = "library",
+             py::arg("spectral") = false, py::arg("ink_limit") = py::none(), py::arg("created") = py::none(),
+             R"(
+Writes a chart as the tool's chart command writes it, byte for byte, and
+atomically (a temporary file beside it, renamed when complete).
+
+layout: 'chart' (the library's 900 patches), 'grid', 'grid:N' or the path of
+a CGATS file whose C, M, Y, K to predict. format: 'library', 'cti3' or
+'cgats'. spectral adds the 36 bands and ink_limit writes TOTAL_INK_LIMIT
+(cti3 and cgats). created replaces the CREATED time (else the clock, or
+SOURCE_DATE_EPOCH). Returns the number of patches written.)")
+        .def("check", &checkModel, py::arg("measurements") = py::none(), R"(
+Checks the model against the combinations a file measured beyond the test
+form (by default the form's own file), as the tool's chart command checks
+it: the library's models on the chart's 900 combinations, the Yule-Nielsen
+model on every combination. Returns a CheckResult; str() of it is the
+tool's summary.)")
+        .def("__getattr__",
+             [](const Model& m, const std::string& name) -> py::object {
+                 if (!m.attributes.contains(name))
+                     throw py::attribute_error("'Model' object has no attribute '" + name + "'");
+                 return m.attributes[py::str(name)];
+             })
+        .def("__dir__",
+             [](py::object self) {
+                 py::list names = py::module_::import("builtins").attr("object").attr("__dir__")(self);
+                 for (const auto& item : self.cast<const Model&>().attributes)
+                     names.append(item.first);
+                 return names;
+             })
+        .def("__repr__", [](const Model& m) {
+            return text("<veltmarquist.Model " + std::string(m.fit.name()) + " fitted to " + m.found->path + ">");
+        });
+
+    module.def("fit", &fitModel, py::arg("form"), py::arg("model") = py::none(), py::arg("fit_gravure") = false,
+               py::arg("scale") = py::none(), R"(
+Fits a print model to the test form in a measurement file.
+
+form: Measurements or the path of a file; the 46 test-form patches are found
+by their C, M, Y, K values in any order, repeats averaged. model: 'offset'
+(the default: the library's offset model, fitted to the two greys),
+'gravure' or 'ynsn' (Yule-Nielsen, predicts every coverage). fit_gravure fits
+the gravure ink order and trapping factors to red, green and blue (implies
+model='gravure'). scale: the reflectance scale when form is a path.
+
+Raises the tool's errors: MissingPatchError naming every missing patch,
+FileFormatError, ContentError, CalculationError, UsageError.)");
+}
+
+} // namespace veltmarquist::python

@@ -1,0 +1,241 @@
+"""The package's arrays, exceptions, files and threads."""
+import os
+import re
+import signal
+import threading
+
+import numpy as np
+import pytest
+
+import veltmarquist
+from conftest import SAMPLES
+
+SHEET = SAMPLES / "offset_press_sheet.txt"
+
+
+@pytest.fixture(scope="module")
+def offset():
+    return veltmarquist.fit(SHEET)
+
+
+@pytest.fixture(scope="module")
+def ynsn():
+    return veltmarquist.fit(SHEET, model="ynsn")
+
+
+def test_measurements_are_the_readers_sets_as_arrays():
+    sheet = veltmarquist.read_measurements(SHEET)
+    assert sheet.device.shape == (302, 4)
+    assert sheet.spectra.shape == (302, 36)
+    assert sheet.device.dtype == sheet.spectra.dtype == np.float64
+    assert not sheet.spectra.flags.writeable
+    # A percent file becomes the library's reflectance factors, in thousandths.
+    assert sheet.scale == 100
+    np.testing.assert_array_equal(sheet.spectra, np.round(sheet.spectra * 1000) / 1000)
+    np.testing.assert_array_equal(sheet.wavelengths, np.arange(380, 740, 10))
+    assert len(sheet.sample_ids) == len(sheet)
+
+
+def test_text_that_is_not_utf8_is_kept_escaped(tmp_path):
+    sheet = tmp_path / "latin1.txt"
+    sheet.write_bytes(b'CGATS.17\nDESCRIPTOR "Pr\xe9sse"\nBEGIN_DATA_FORMAT\nSAMPLE_ID SAMPLE_NAME CMYK_C CMYK_M '
+                      b'CMYK_Y CMYK_K\nEND_DATA_FORMAT\nBEGIN_DATA\n1 caf\xe9 0 0 0 0\nEND_DATA\n')
+    measurements = veltmarquist.read_measurements(sheet)
+    assert measurements.sample_names == ["caf\\xe9"]
+    assert measurements.keywords["DESCRIPTOR"] == "Pr\\xe9sse"
+
+
+def test_sixteen_bands_and_files_without_spectra():
+    sixteen = veltmarquist.read_measurements(SAMPLES / "offset_form_16band.txt")
+    # The library widens 400-700 nm in 20 nm steps: 380-410 nm take the 420 nm value.
+    assert sixteen.spectra.shape == (46, 36)
+    np.testing.assert_array_equal(sixteen.spectra[:, 0], sixteen.spectra[:, 4])
+    target = veltmarquist.read_measurements(SAMPLES / "target_paper.txt")
+    assert target.device.shape == (1, 0)
+    assert veltmarquist.read_measurements(SAMPLES / "offset_form.txt").xyz is None
+
+
+FITTED = {  # model: attribute, what it holds
+    "offset": [("gray_difference_factor", (4,)), ("full_correction", float), ("levels", (9,))],
+    "gravure": [("ink_order", str), ("trapping_factors", (3,))],
+    "ynsn": [("yule_nielsen_n", (36,)), ("ink_spreading", (4,)), ("dot_area_k", (9,)),
+             ("tint_residual_rms", float), ("grey_delta_e_ab", (2,)), ("warnings", list), ("levels", None)],
+}
+
+
+@pytest.mark.parametrize("model, attribute, holds", [(model, *value) for model, values in FITTED.items()
+                                                     for value in values], ids=lambda value: str(value))
+def test_fitted_values_are_attributes(model, attribute, holds):
+    value = getattr(veltmarquist.fit(SHEET, model=model), attribute)
+    if isinstance(holds, tuple):
+        assert value.shape == holds
+    elif holds is None:
+        assert value is None
+    else:
+        assert isinstance(value, holds)
+
+
+def test_colour_differences_broadcast():
+    assert veltmarquist.delta_e_ab([50, 0, 0], [53, 4, 0]) == 5.0
+    assert veltmarquist.delta_e_2000(np.zeros((2, 3, 3)), [50, 0, 0]).shape == (2, 3)
+
+
+@pytest.mark.parametrize("cmyk, shape", [([40, 40, 40, 0], ()), ([[40, 40, 40, 0]] * 3, (3,)),
+                                         (np.zeros((2, 5, 4)), (2, 5))], ids=["one row", "rows", "grid"])
+def test_predictions_keep_the_shape_and_the_librarys_colorimetry(offset, cmyk, shape):
+    spectra, xyz, lab = offset.predict(cmyk)
+    assert spectra.shape == shape + (36,)
+    assert xyz.shape == lab.shape == shape + (3,)
+    np.testing.assert_array_equal(veltmarquist.spectra_to_xyz(spectra), xyz)
+    np.testing.assert_array_equal(veltmarquist.xyz_to_lab(xyz), lab)
+
+
+def test_the_check_is_the_tools_colour_difference(ynsn):
+    check = ynsn.check()
+    assert len(check) == check.summary.count == 230
+    np.testing.assert_array_equal(veltmarquist.delta_e_2000(check.measured_lab, check.predicted_lab),
+                                  check.delta_e_2000)
+    assert check.delta_e_2000[check.largest] == check.summary.max
+    assert ynsn.check(SAMPLES / "offset_form.txt").summary.count == 0  # the form alone measures nothing beyond
+
+
+ERRORS = {
+    "missing file": (lambda m: veltmarquist.read_measurements(SAMPLES / "absent.txt"), FileNotFoundError,
+                     "absent.txt: cannot open"),
+    "missing patches": (lambda m: veltmarquist.fit(SAMPLES / "chart_two_whites.txt"), veltmarquist.MissingPatchError,
+                        "27 test-form patches are missing: 3 (C 100 M 100 Y 0 K 100), 6"),
+    "contradicted scale": (lambda m: veltmarquist.read_measurements(SHEET, scale=1), ValueError, "scale"),
+    "off the form's levels": (lambda m: m.predict([35, 0, 0, 0]), ValueError,
+                              "predicts only the form's levels 0, 10, 20, 40, 60, 70, 80, 90, 100 %; C 35 is not one"),
+    "outside 0-100": (lambda m: m.predict([[0, 0, 0, 0], [0, 100.5, 0, 0]]), ValueError,
+                      "patch 1: M 100.5 is not a coverage from 0 to 100 %"),
+    "not a number": (lambda m: m.predict([0, 0, float("nan"), 0]), ValueError, "Y nan is not a coverage"),
+    "wrong shape": (lambda m: m.predict([1, 2, 3]), ValueError, "cmyk must hold 4 values per row"),
+    "unknown format": (lambda m: m.chart("x", format="icc"), veltmarquist.UsageError, "unknown chart format 'icc'"),
+    "grid off the levels": (lambda m: m.chart("x", layout="grid:7"), veltmarquist.UsageError, "predicts only"),
+    "fit_gravure and ynsn": (lambda m: veltmarquist.fit(SHEET, model="ynsn", fit_gravure=True),
+                             veltmarquist.UsageError, "cannot go with model='ynsn'"),
+    "six inks from a four-colour form": (lambda m: veltmarquist.multichannel_chart(SHEET, 6, "x"),
+                                         veltmarquist.ContentError, "6 inks need the device fields 6CLR_1"),
+    "five inks": (lambda m: veltmarquist.multichannel_chart(SHEET, 5, "x"), veltmarquist.UsageError,
+                  "inks must be 6 or 7"),
+    "a spreadsheet": (lambda m: veltmarquist.read_measurements(write("a.csv", "C;M;Y;K\n1;2;3;4\n")),
+                      veltmarquist.FileFormatError, "save it as CGATS text"),
+    "one id, two patches": (lambda m: veltmarquist.read_measurements(write("d.txt", DUPLICATE)),
+                            veltmarquist.DuplicatePatchError, "d.txt:8: duplicate patch: sample 1"),
+    "ink in channel 5": (lambda m: convert(np.full((1, 5), 10.0), "convert"), veltmarquist.ContentError,
+                         "give cmyk_only=True"),
+    "a white without reflectance": (lambda m: convert(np.zeros((1, 4)), "convert", from_white=np.zeros(36)),
+                                    veltmarquist.ContentError, "the from white has no reflectance at 380 nm"),
+    "percent for reflectance": (lambda m: convert(np.zeros((1, 4)), "copy", spectra=np.full((1, 36), 80.0)),
+                                ValueError, "reflectance factors lie from 0 to 1"),
+    "a blend without whites": (lambda m: convert(np.zeros((1, 4)), "blend", from_white=None),
+                               veltmarquist.UsageError, "mode 'blend' needs both whites"),
+    "a folder for a chart": (lambda m: m.chart("."), veltmarquist.OutputError, ".: is a folder"),
+    "a chart in a missing folder": (lambda m: m.chart("no/chart.txt"), veltmarquist.OutputError,
+                                    "no/chart.txt: cannot create a file in no/"),
+    "a scale for a file already read": (lambda m: veltmarquist.fit(m.form, scale=1), ValueError,
+                                        "scale applies to a file read from a path"),
+}
+
+DUPLICATE = """CGATS.17
+BEGIN_DATA_FORMAT
+SAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K
+END_DATA_FORMAT
+BEGIN_DATA
+1 0 0 0 0
+2 10 0 0 0
+1 20 0 0 0
+END_DATA
+"""
+
+
+def write(name, text):
+    with open(name, "w") as file:
+        file.write(text)
+    return name
+
+
+def convert(channels, mode, spectra=np.full((1, 36), 0.5), from_white=np.full(36, 0.9)):
+    return veltmarquist.convert_chart(spectra, channels, from_white, np.full(36, 0.8), mode, "out.txt")
+
+
+@pytest.mark.parametrize("call, error, message", ERRORS.values(), ids=ERRORS.keys())
+def test_failures_raise_the_tools_messages_and_write_nothing(offset, tmp_path, monkeypatch, call, error, message):
+    monkeypatch.chdir(tmp_path)
+    with pytest.raises(error, match=re.escape(message)):
+        call(offset)
+    assert [name for name in os.listdir(tmp_path) if name not in ("a.csv", "d.txt")] == []
+
+
+@pytest.mark.parametrize("separations, message", [
+    (np.zeros((3498, 7)), "3498 separations for 3499 combinations"),
+    (np.full((3499, 7), 100.5), "the separation of combination 1 (C 0 M 0 Y 0 K 0) has channel 1 = 100.5"),
+    (np.zeros((3499, 6)), "separations must hold 7 values per row"),
+], ids=["too few", "above 100 %", "six columns for seven inks"])
+def test_bad_separations_are_refused(tmp_path, separations, message):
+    chart = veltmarquist.multichannel_chart(SAMPLES / "seven_ink_form.txt", 7, tmp_path / "chart.txt")
+    with pytest.raises(ValueError, match=re.escape(message)):
+        chart.separated_chart(separations, tmp_path / "separated.txt")
+    assert os.listdir(tmp_path) == ["chart.txt"]
+
+
+def test_a_failed_chart_leaves_the_existing_file(offset, tmp_path):
+    target = tmp_path / "chart.txt"
+    target.write_text("before")
+    target.chmod(0o640)
+    with pytest.raises(veltmarquist.UsageError):
+        offset.chart(target, format="library", spectral=True)
+    offset.chart(target, layout="grid:2", format="cgats", created="2025-01-02T03:04:05Z")
+    assert 'CREATED\t"2025-01-02T03:04:05Z"' in target.read_text()
+    offset.chart(target)
+    assert oct(target.stat().st_mode & 0o777) == oct(0o640)
+    assert sorted(os.listdir(tmp_path)) == ["chart.txt"]
+    assert target.read_text().endswith("END_DATA\n")
+    assert signal.getsignal(signal.SIGINT) is signal.default_int_handler  # Ctrl-C stays Python's
+
+
+def test_outputs_follow_links_and_write_into_devices(offset, tmp_path):
+    (tmp_path / "charts").mkdir()
+    link = tmp_path / "latest.txt"
+    link.symlink_to("charts/chart.txt")
+    offset.chart(link)
+    assert link.is_symlink()
+    assert (tmp_path / "charts" / "chart.txt").read_text().endswith("END_DATA\n")
+    assert offset.chart("/dev/null", layout="grid") == 6561
+    assert sorted(os.listdir(tmp_path / "charts")) == ["chart.txt"]
+
+
+def test_one_multichannel_chart_separates_in_two_threads(tmp_path):
+    chart = veltmarquist.multichannel_chart(SAMPLES / "seven_ink_form.txt", 7, tmp_path / "chart.txt")
+    answers = [np.hstack([chart.combinations, np.full((3499, 3), share)]) for share in (0.0, 50.0)]
+    for index, separations in enumerate(answers):
+        chart.separated_chart(separations, tmp_path / f"serial{index}.txt")
+    threads = [threading.Thread(target=chart.separated_chart, args=(separations, tmp_path / f"threads{index}.txt"))
+               for index, separations in enumerate(answers) for _ in range(3)]
+    for thread in threads:
+        thread.start()
+    for thread in threads:
+        thread.join()
+    for index in range(len(answers)):
+        assert (tmp_path / f"threads{index}.txt").read_bytes() == (tmp_path / f"serial{index}.txt").read_bytes()
+
+
+def test_two_models_fit_and_predict_in_two_threads(offset, ynsn):
+    coverages = np.array(np.meshgrid(*[[0, 10, 20, 40, 60, 70, 80, 90, 100]] * 4)).reshape(4, -1).T
+    expected = {model.name: model.predict(coverages).xyz for model in (offset, ynsn)}
+    results = {}
+
+    def predict(name):
+        model = veltmarquist.fit(SHEET, model=name)
+        results[name] = [model.predict(coverages).xyz for _ in range(5)]
+
+    threads = [threading.Thread(target=predict, args=(name,)) for name in expected]
+    for thread in threads:
+        thread.start()
+    for thread in threads:
+        thread.join()
+    assert results.keys() == expected.keys()
+    for name, runs in results.items():
+        for xyz in runs:
+            np.testing.assert_array_equal(xyz, expected[name])
