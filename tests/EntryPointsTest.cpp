@@ -12,7 +12,6 @@
 
 #include <atomic>
 #include <cstdlib>
-#include <cstring>
 #include <new>
 
 using namespace testsupport;
@@ -45,12 +44,7 @@ std::vector<double> placedRow(int n, int kind, int first)
         for (int i = 0; i < n; ++i)
             block.push_back(5 + 10 * i);
     block.insert(block.end(), 21, 0);
-    TempDir dir;
-    void* profile = CreateMathProfile("rows");
-    EXPECT_EQ(CalculateChart(profile, VM_PROCESS_CHART_COPY, dir.path("r").c_str(), block.data(), kind, first, n, 3),
-              VM_STATUS_OK);
-    DestroyMathProfile(profile);
-    const auto values = fields(lines(readFile(dir.path("r"))).at(7));
+    const auto values = fields(lines(chartOf({kind, first, n, 3, block}, VM_PROCESS_CHART_COPY)).at(7));
     std::vector<double> row;
     for (size_t i = 5; i < 41; ++i)
         row.push_back(std::stod(values.at(i)) * 1000.0);
@@ -59,17 +53,9 @@ std::vector<double> placedRow(int n, int kind, int first)
 
 } // namespace
 
-TEST(Profile, ConstructionValuesAndVersion)
+TEST(Profile, NameAndVersion)
 {
-    MathProfile profile(nullptr);
-    EXPECT_STREQ(profile.profileName, "");
-    EXPECT_EQ(profile.rgbFactor[0], 0.9);
-    EXPECT_EQ(profile.rgbFactor[2], 0.85);
-    EXPECT_EQ(profile.coverageLimit, 200.0);
-    EXPECT_EQ(profile.inkOrder, 2);
-    EXPECT_EQ(profile.grayDiffFactor[3], 0.0);
-    const MathProfile::ColorPatch zero = {};
-    EXPECT_EQ(std::memcmp(&profile.patchSlots[21], &zero, sizeof zero), 0);
+    EXPECT_STREQ(MathProfile(nullptr).profileName, "");
     const std::string longName(1500, 'x');
     EXPECT_EQ(std::string(MathProfile(longName.c_str()).profileName), longName.substr(0, 1023));
     EXPECT_STREQ(VeltmarquistDLLVersionString, "@(#)PROGRAM:VeltmarquistDLL  PROJECT:Pellinore_AllModules-1\n");
@@ -104,9 +90,7 @@ TEST(Statuses, ACalculationThatThrowsGivesStatusThree)
     TempDir dir;
     MeasurementBlock block = readGoldenInput("multichannel.in");
     failPatchAllocations = true;
-    const int status = CalculateChart(CreateMathProfile("throws"), VM_PROCESS_SIX_COLOUR, dir.path("x").c_str(),
-                                      block.ints.data(), block.inputKind, block.firstWavelength,
-                                      block.valuesPerPatch, block.count);
+    const int status = calculate(CreateMathProfile("throws"), VM_PROCESS_SIX_COLOUR, dir.path("x"), block);
     failPatchAllocations = false;
     EXPECT_EQ(status, VM_STATUS_CALCULATION_FAILED); // and the profile is gone
 }

@@ -7,6 +7,7 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <algorithm>
 #include <cstring>
 #include <limits>
 #include <memory>
@@ -17,16 +18,6 @@ using namespace testsupport;
 namespace {
 
 using Form = std::vector<std::vector<double>>;
-
-// Rows of a kind-10 block at 380 nm with 36 bands, as CalculateChart makes them.
-Form rowsOf(const MeasurementBlock& block)
-{
-    Form form(static_cast<size_t>(block.count));
-    for (size_t i = 0; i < form.size(); ++i)
-        for (size_t b = 0; b < 36; ++b)
-            form[i].push_back(block.ints[i * 36 + b] / 1000.0);
-    return form;
-}
 
 // One fit on its own profile and its own copy of the rows (readData may
 // exchange rows), then the 900-patch offset chart from the fitted profile.
@@ -78,7 +69,8 @@ std::unique_ptr<FitRun> expectSameFit(const Form& form, const std::string& what,
             << "slot " << slot;
     for (int list = 0; list < MathProfile::kChannels; ++list) {
         const auto &a = fast->listsAfterFit[list], &b = reference.listsAfterFit[list];
-        EXPECT_TRUE(a.size() == b.size() && sameBytes(a.data(), b.data(), a.size() * patchSize)) << "list " << list;
+        EXPECT_EQ(a.size(), b.size()) << "list " << list;
+        EXPECT_TRUE(sameBytes(a.data(), b.data(), std::min(a.size(), b.size()) * patchSize)) << "list " << list;
     }
     EXPECT_FALSE(fast->chart.empty());
     EXPECT_EQ(fast->chart, reference.chart);
@@ -89,9 +81,7 @@ void multiChannelChartFirst(MathProfile& profile)
 {
     TempDir dir;
     MeasurementBlock block = readGoldenInput("multichannel.in");
-    ASSERT_EQ(CalculateChart(&profile, VM_PROCESS_SIX_COLOUR, dir.path("p3").c_str(), block.ints.data(),
-                             block.inputKind, block.firstWavelength, block.valuesPerPatch, block.count),
-              VM_STATUS_OK);
+    ASSERT_EQ(calculate(&profile, VM_PROCESS_SIX_COLOUR, dir.path("p3"), block), VM_STATUS_OK);
 }
 
 // Every lane of the fast grid against setSample + calcOffsetSample at the
@@ -173,7 +163,7 @@ void expectGridColoursMatch(const Form& form, const std::string& what, void (*pr
 
 TEST(GrayFitFastPath, GridColoursAreThoseOfTheOffsetModelBitForBit)
 {
-    expectGridColoursMatch(rowsOf(readGoldenInput("offset-form.in")), "offset-form", nullptr, 5);
+    expectGridColoursMatch(spectraOf(readGoldenInput("offset-form.in")), "offset-form", nullptr, 5);
     expectGridColoursMatch(syntheticForm(0), "synthetic variant 0", nullptr, 5);
     expectGridColoursMatch(syntheticForm(2), "synthetic variant 2", nullptr, 5);
     expectGridColoursMatch(syntheticForm(1), "synthetic variant 1 after process 3", multiChannelChartFirst, 5);
@@ -181,11 +171,11 @@ TEST(GrayFitFastPath, GridColoursAreThoseOfTheOffsetModelBitForBit)
 
 TEST(GrayFitFastPath, GoldenFormFitsAndChartsAsTheStraightforwardSearch)
 {
-    const auto fast = expectSameFit(rowsOf(readGoldenInput("offset-form.in")), "offset-form");
+    const auto fast = expectSameFit(spectraOf(readGoldenInput("offset-form.in")), "offset-form");
     EXPECT_EQ(fast->chart, readFile(goldenPath("offset-form.p0.chart")));
 }
 
-TEST(GrayFitFastPath, SyntheticFormsIncludingOneReadInSwappedHalves)
+TEST(GrayFitFastPath, SyntheticFormsSwappedHalvesAndAProfileReusedAfterAMultiChannelChart)
 {
     for (int variant : {1, 3})
         expectSameFit(syntheticForm(variant), "synthetic variant " + std::to_string(variant));
@@ -195,10 +185,6 @@ TEST(GrayFitFastPath, SyntheticFormsIncludingOneReadInSwappedHalves)
     for (size_t i = 0; i + 24 < swapped.size(); ++i)
         std::swap(swapped[i], swapped[i + 24]);
     expectSameFit(swapped, "synthetic variant 2, halves swapped");
-}
-
-TEST(GrayFitFastPath, ProfileReusedAfterAMultiChannelChart)
-{
     // The multi-channel chart leaves 0 % tone-ramp patches in every tint
     // list, so the three-colour grey selects a 0 % black patch instead of
     // the paper, and each list's last patch is another solid.
