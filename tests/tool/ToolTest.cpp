@@ -220,18 +220,3 @@ TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
     EXPECT_EQ(help.exitCode, 0);
     EXPECT_THAT(help.out, HasSubstr("6  a patch the calculation needs is missing"));
 }
-
-TEST(CommandLine, RealMeasuredDataSet)
-{
-    const std::string path = VELTMARQUIST_SHARED_DATA_DIR "/APTEC_PC10_CardBoard_2023_v1_Spectral.txt";
-    if (!ts::fileExists(path))
-        GTEST_SKIP() << "no evaluation data set at " << path << " (the real press data set is not beside the project)";
-    ts::TempDir dir;
-    const ToolRun run = runTool({"chart", path, "-o", "chart.txt"}, dir.dir());
-    expectSuccess(run);
-    // The file's quirks read, the patches found among repeats, the model checked on 720 measured combinations.
-    EXPECT_THAT(run.out, HasSubstr("1617 measurements, 36 bands 380-730 nm in 10 nm steps, reflectance 0-1 (detected)\n"
-                                   "  46 test-form patches found in 68 measurements (repeated measurements averaged "
-                                   "for 22 of them)"));
-    EXPECT_THAT(run.out, HasSubstr("check: 720 chart combinations measured beyond the test form, CIEDE2000 mean 1."));
-}
