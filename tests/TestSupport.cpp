@@ -8,7 +8,6 @@
 #include <fstream>
 #include <sstream>
 #include <stdexcept>
-#include <unistd.h>
 
 namespace testsupport {
 
@@ -25,11 +24,6 @@ std::string readFile(const std::string& path)
     std::ostringstream text;
     text << in.rdbuf();
     return text.str();
-}
-
-bool fileExists(const std::string& path)
-{
-    return access(path.c_str(), F_OK) == 0;
 }
 
 MeasurementBlock readGoldenInput(const std::string& name)
@@ -56,7 +50,7 @@ MeasurementBlock withSeparations(MeasurementBlock block)
     return block;
 }
 
-int calculate(void* profile, int process, const std::string& path, MeasurementBlock& block)
+int calculateBlock(void* profile, int process, const std::string& path, MeasurementBlock& block)
 {
     return CalculateChart(profile, static_cast<PrintProcess>(process), path.c_str(), block.ints.data(),
                           block.inputKind, block.firstWavelength, block.valuesPerPatch, block.count);
@@ -66,7 +60,7 @@ std::string chartOf(MeasurementBlock block, int process)
 {
     TempDir dir;
     void* profile = CreateMathProfile("chart");
-    const int status = calculate(profile, process, dir.path("c"), block);
+    const int status = calculateBlock(profile, process, dir.path("c"), block);
     EXPECT_EQ(status, VM_STATUS_OK) << "process " << process;
     DestroyMathProfile(profile);
     return status == VM_STATUS_OK ? readFile(dir.path("c")) : std::string();

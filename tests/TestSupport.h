@@ -8,6 +8,7 @@
 #include "ScratchAllocation.h"
 
 #include <cstdlib>
+#include <filesystem>
 #include <memory>
 #include <string>
 #include <vector>
@@ -29,10 +30,10 @@ MeasurementBlock readGoldenInput(const std::string& name);
 MeasurementBlock withSeparations(MeasurementBlock block);
 std::string goldenPath(const std::string& name);
 std::string readFile(const std::string& path);
-bool fileExists(const std::string& path);
+inline bool fileExists(const std::string& path) { std::error_code e; return std::filesystem::exists(path, e); }
 
 // CalculateChart with the block's layout.
-int calculate(void* profile, int process, const std::string& path, MeasurementBlock& block);
+int calculateBlock(void* profile, int process, const std::string& path, MeasurementBlock& block);
 // The chart of one call on a fresh profile; a test failure and "" when the status is not 0.
 std::string chartOf(MeasurementBlock block, int process);
 

@@ -33,7 +33,7 @@ void* primedProfile(const TempDir& dir)
 {
     MeasurementBlock block = readGoldenInput("multichannel.in");
     void* profile = CreateMathProfile("primed");
-    return calculate(profile, 3, dir.path("primed.txt"), block) == 0 ? profile : throw std::runtime_error("process 3");
+    return calculateBlock(profile, 3, dir.path("primed.txt"), block) == 0 ? profile : throw std::runtime_error("process 3");
 }
 
 // Data lines of a chart ending with "END_DATA" and a line feed; -1 otherwise.
@@ -88,7 +88,7 @@ TEST(HostileCalls, EachRuleGivesItsStatusAndLeavesNoTraceWhileTheLimitsPass)
             EXPECT_TRUE(block.ints == before) << "the block changed";
         }
     MeasurementBlock separated = input("multichannel.in", VM_PROCESS_SEPARATED_SET);
-    ASSERT_EQ(calculate(profile, VM_PROCESS_SEPARATED_SET, path, separated), VM_STATUS_OK);
+    ASSERT_EQ(calculateBlock(profile, VM_PROCESS_SEPARATED_SET, path, separated), VM_STATUS_OK);
     EXPECT_TRUE(readFile(path) == readFile(goldenPath("multichannel.p3-p6.chart")));
     DestroyMathProfile(profile);
     // A profile's name may be null or longer than the 1023 characters it keeps.
@@ -98,7 +98,7 @@ TEST(HostileCalls, EachRuleGivesItsStatusAndLeavesNoTraceWhileTheLimitsPass)
                                         {381, 1}}) {
         MeasurementBlock block = readGoldenInput("conversion.in");
         block.firstWavelength = first, block.valuesPerPatch = bands;
-        ASSERT_EQ(calculate(profile, VM_PROCESS_CHART_COPY, path, block), VM_STATUS_OK) << first << " nm, " << bands;
+        ASSERT_EQ(calculateBlock(profile, VM_PROCESS_CHART_COPY, path, block), VM_STATUS_OK) << first << " nm, " << bands;
         EXPECT_EQ(dataLines(readFile(path)), block.count - 2) << first << " nm, " << bands;
     }
     DestroyMathProfile(profile);
@@ -123,7 +123,7 @@ TEST(UnopenablePath, GivesStatusOneAndCreatesNothing)
                 continue;
             MeasurementBlock block = input(name, process);
             const std::vector<int> before = block.ints;
-            EXPECT_EQ(calculate(process == 6 ? primedProfile(dir) : CreateMathProfile("path"), process, path, block),
+            EXPECT_EQ(calculateBlock(process == 6 ? primedProfile(dir) : CreateMathProfile("path"), process, path, block),
                       VM_STATUS_FILE_NOT_OPENED) << "process " << process << " on '" << path.substr(0, 80) << "'";
             EXPECT_TRUE(block.ints == before);
         }
@@ -157,10 +157,10 @@ TEST(DegenerateReflectance, GivesACompleteChart)
                 block.ints[size_t(i)] = (only ? only : changes[c])(i % n, block.ints[size_t(i)],
                                                                    i / n == (paper >= 0 ? paper : block.count + paper));
             void* profile = CreateMathProfile("degenerate");
-            ASSERT_EQ(calculate(profile, process, path, block), VM_STATUS_OK);
+            ASSERT_EQ(calculateBlock(profile, process, path, block), VM_STATUS_OK);
             EXPECT_EQ(dataLines(readFile(path)), sets > 0 ? sets : block.count - 2);
             if (MeasurementBlock separated = input("multichannel.in", 6); process == 3 || process == 5) {
-                ASSERT_EQ(calculate(profile, VM_PROCESS_SEPARATED_SET, path, separated), VM_STATUS_OK);
+                ASSERT_EQ(calculateBlock(profile, VM_PROCESS_SEPARATED_SET, path, separated), VM_STATUS_OK);
                 EXPECT_EQ(dataLines(readFile(path)), VM_EXCHANGE_RECORDS);
             }
             DestroyMathProfile(profile);
@@ -177,20 +177,20 @@ TEST(SeparatedSet, WithoutRampsOfProcessThreeOrFiveGivesStatusFour)
     MeasurementBlock form = readGoldenInput("offset-form.in"), seven = readGoldenInput("multichannel.in"), six = seven;
     six.count = 9;
     auto rejected = [&](void* profile) {
-        EXPECT_EQ(calculate(profile, 6, path, tenNm), kInvalid);
-        EXPECT_EQ(calculate(profile, 6, path, sixteenBands), kInvalid);
+        EXPECT_EQ(calculateBlock(profile, 6, path, tenNm), kInvalid);
+        EXPECT_EQ(calculateBlock(profile, 6, path, sixteenBands), kInvalid);
         EXPECT_FALSE(fileExists(path));
     };
     void* fourColour = CreateMathProfile("four colour");
-    ASSERT_EQ(calculate(fourColour, VM_PROCESS_GRAVURE, dir.path("p1.txt"), form), VM_STATUS_OK);
+    ASSERT_EQ(calculateBlock(fourColour, VM_PROCESS_GRAVURE, dir.path("p1.txt"), form), VM_STATUS_OK);
     rejected(fourColour);
     DestroyMathProfile(fourColour);
     void* profile = CreateMathProfile("no ramps");
     rejected(profile);
-    ASSERT_EQ(calculate(profile, VM_PROCESS_SIX_COLOUR, dir.path("p3.txt"), six), kInvalid);
+    ASSERT_EQ(calculateBlock(profile, VM_PROCESS_SIX_COLOUR, dir.path("p3.txt"), six), kInvalid);
     rejected(profile);
-    ASSERT_EQ(calculate(profile, VM_PROCESS_SEVEN_COLOUR, dir.path("p5.txt"), seven), VM_STATUS_OK);
-    ASSERT_EQ(calculate(profile, VM_PROCESS_SEPARATED_SET, path, tenNm), VM_STATUS_OK);
+    ASSERT_EQ(calculateBlock(profile, VM_PROCESS_SEVEN_COLOUR, dir.path("p5.txt"), seven), VM_STATUS_OK);
+    ASSERT_EQ(calculateBlock(profile, VM_PROCESS_SEPARATED_SET, path, tenNm), VM_STATUS_OK);
     EXPECT_TRUE(readFile(path) == readFile(goldenPath("multichannel.p5-p6.chart")));
     DestroyMathProfile(profile);
 }
@@ -204,7 +204,7 @@ TEST(Regression, SixteenBandConversionsReadTheChannelValuesBehindThePatches)
     TempDir dir;
     for (int process : {VM_PROCESS_CHART_COPY, VM_PROCESS_CHART_CONVERT, VM_PROCESS_CHART_BLEND}) {
         void* profile = CreateMathProfile("16-band conversion");
-        ASSERT_EQ(calculate(profile, process, dir.path("chart.txt"), block), VM_STATUS_OK);
+        ASSERT_EQ(calculateBlock(profile, process, dir.path("chart.txt"), block), VM_STATUS_OK);
         EXPECT_THAT(readFile(dir.path("chart.txt")), HasSubstr("BEGIN_DATA\n1\t100\t0\t40\t0\t")) << "process " << process;
         DestroyMathProfile(profile);
     }
@@ -242,7 +242,7 @@ TEST(AllocationFailure, EachFailingBufferGivesStatusFiveAndReleasesTheOthers)
         for (int n = 1;; ++n) {
             SCOPED_TRACE(std::string(reference) + ", failing buffer " + std::to_string(n));
             const std::size_t heapBefore = heapInUse();
-            int status = [&, p = process] { FailingAllocation f(n); return calculate(profile, p, path, block); }();
+            int status = [&, p = process] { FailingAllocation f(n); return calculateBlock(profile, p, path, block); }();
             if (FailingAllocation::seen < n) { // nothing failed
                 ASSERT_EQ(status, VM_STATUS_OK);
                 EXPECT_GT(n, block.count) << "fewer buffers than patches: the seam is not used";
@@ -271,7 +271,7 @@ std::vector<std::string> run(const Sequence& sequence)
     void* profile = CreateMathProfile("thread");
     std::vector<std::string> charts;
     for (const auto& [name, process] : sequence)
-        if (MeasurementBlock block = input(name, process); calculate(profile, process, dir.path("c"), block) == 0)
+        if (MeasurementBlock block = input(name, process); calculateBlock(profile, process, dir.path("c"), block) == 0)
             charts.push_back(readFile(dir.path("c")));
     DestroyMathProfile(profile);
     return charts;
