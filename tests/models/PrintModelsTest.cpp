@@ -116,13 +116,14 @@ TEST(PrintModels, RefuseCoveragesTheyDoNotPredictAndWriteNothing)
         return "predicted";
     };
     for (const auto& c : cases) {
+        SCOPED_TRACE(c.message);
         EXPECT_EQ(refusal([&] { c.model->predict(c.cmyk); }), c.message);
         // In a batch the refused patch is named, and nothing is written.
         const double batch[8] = {0, 0, 0, 0, c.cmyk[0], c.cmyk[1], c.cmyk[2], c.cmyk[3]};
         std::vector<double> spectra(72, -7.0);
         EXPECT_EQ(refusal([&] { c.model->predict(2, batch, spectra.data(), nullptr, nullptr); }),
                   "patch 1: " + c.message);
-        EXPECT_EQ(spectra, std::vector<double>(72, -7.0)) << c.message;
+        EXPECT_EQ(spectra, std::vector<double>(72, -7.0)) << "written before the refusal";
     }
     EXPECT_EQ(refusal([] { MeasuredForm(std::vector<Spectrum>(45)); }),
               "a measured form holds the 46 spectra of the test form; 45 were given");

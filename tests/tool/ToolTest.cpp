@@ -174,10 +174,12 @@ TEST(CommandLine, EveryCommandEqualsTheLibrarysCharts)
         {"chart.txt", "31", "PAPER_TARGET", "convert", "conversion.p8.chart"},
         {"chart.txt", "PAPER_PRINTED", "PAPER_TARGET", "blend", "conversion.p9.chart"}};
     // The chart's channels 5-7 hold ink, which the library's converted chart drops.
-    for (const auto& [chart, from, to, mode, golden] : convertCases)
+    for (const auto& [chart, from, to, mode, golden] : convertCases) {
+        SCOPED_TRACE(mode);
         expectSuccess(runTool({"convert", chart, "--from", from, "--to", to, "--mode", mode, "-o", "out.txt", "--cmyk-only"},
                               dir.dir()),
                       dir.path("out.txt"), golden);
+    }
 }
 
 TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
