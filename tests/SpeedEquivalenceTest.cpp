@@ -161,12 +161,16 @@ TEST(GrayFitFastPath, GridColoursAreThoseOfTheOffsetModelBitForBit)
     expectGridColoursMatch(syntheticForm(1), "synthetic variant 1 after process 3", multiChannelChartFirst);
 }
 
-TEST(GrayFitFastPath, FormsFitAndChartAsTheStraightforwardSearch)
+TEST(GrayFitFastPath, GoldenAndSyntheticFormsFitAndChartAsTheStraightforwardSearch)
 {
     EXPECT_EQ(expectSameFit(spectraOf(readGoldenInput("offset-form.in")), "offset-form")->chart,
               readFile(goldenPath("offset-form.p0.chart")));
     for (int variant : {1, 3})
         expectSameFit(syntheticForm(variant), "synthetic variant " + std::to_string(variant));
+}
+
+TEST(GrayFitFastPath, SwappedHalvesAndAProfileReusedAfterAMultiChannelChart)
+{
     // The two halves of the form measured in swapped order: readData
     // exchanges the rows back before either fit reads rows 44 and 45.
     Form swapped = syntheticForm(2);
