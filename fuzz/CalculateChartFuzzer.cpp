@@ -119,9 +119,6 @@ void modelCall(Call call, const std::vector<int>& block, const int* coverages, s
                                      call.firstWavelength, call.valuesPerPatch, call.count,
                                      (call.flags & kNullPath) != 0 ? nullptr : &model);
     scratch::setAllocator(previous);
-    // Until the library holds the Yule-Nielsen fit, its selector names no model.
-    if (p == VM_MODEL_YULE_NIELSEN && status == VM_STATUS_UNKNOWN_MODEL && rejection != VM_STATUS_UNKNOWN_INPUT_KIND)
-        return;
     if (rejection != 0 || (failingNth > 0 && allocated >= failingNth)) {
         promise(rejection != 0 ? status == rejection && allocated == 0 : status == VM_STATUS_OUT_OF_MEMORY,
                 "the documented rejection of a fit allocating nothing, or 5 for a failing allocation", p, status);

@@ -4,10 +4,10 @@
 
 #include <cmath>
 #include <cstdlib>
+#include <filesystem>
 #include <fstream>
 #include <sstream>
 #include <stdexcept>
-#include <unistd.h>
 
 namespace testsupport {
 
@@ -26,11 +26,6 @@ std::string readFile(const std::string& path)
     return text.str();
 }
 
-bool fileExists(const std::string& path)
-{
-    return access(path.c_str(), F_OK) == 0;
-}
-
 MeasurementBlock readGoldenInput(const std::string& name)
 {
     std::istringstream in(readFile(goldenPath(name)));
@@ -45,20 +40,45 @@ MeasurementBlock readGoldenInput(const std::string& name)
     return block;
 }
 
+MeasurementBlock withSeparations(MeasurementBlock block)
+{
+    std::istringstream in(readFile(goldenPath("multichannel.separations")));
+    for (int i = 0; i < VM_EXCHANGE_BUFFER_INTS; ++i)
+        in >> block.ints[static_cast<size_t>(i)];
+    if (!in)
+        throw std::runtime_error("malformed golden separations");
+    return block;
+}
+
+int calculateBlock(void* profile, int process, const std::string& path, MeasurementBlock& block)
+{
+    return CalculateChart(profile, static_cast<PrintProcess>(process), path.c_str(), block.ints.data(),
+                          block.inputKind, block.firstWavelength, block.valuesPerPatch, block.count);
+}
+
+std::string chartOf(MeasurementBlock block, int process)
+{
+    TempDir dir;
+    void* profile = CreateMathProfile("chart");
+    const int status = calculateBlock(profile, process, dir.path("c"), block);
+    EXPECT_EQ(status, VM_STATUS_OK) << "process " << process;
+    DestroyMathProfile(profile);
+    return status == VM_STATUS_OK ? readFile(dir.path("c")) : std::string();
+}
+
+std::vector<std::vector<double>> spectraOf(const MeasurementBlock& block)
+{
+    std::vector<std::vector<double>> spectra(static_cast<size_t>(block.count));
+    for (size_t i = 0; i < spectra.size(); ++i)
+        for (size_t j = 0; j < 36; ++j)
+            spectra[i].push_back(block.ints[i * static_cast<size_t>(block.valuesPerPatch) + j] / 1000.0);
+    return spectra;
+}
+
 RowTable::RowTable(const std::vector<std::vector<double>>& spectra) : storage_(spectra), table_(2000, nullptr)
 {
     for (size_t i = 0; i < storage_.size(); ++i)
         table_[i] = storage_[i].data();
-}
-
-RowTable RowTable::fromBlock(const MeasurementBlock& block)
-{
-    std::vector<std::vector<double>> spectra(static_cast<size_t>(block.count), std::vector<double>(36));
-    for (int i = 0; i < block.count; ++i)
-        for (int j = 0; j < 36; ++j)
-            spectra[static_cast<size_t>(i)][static_cast<size_t>(j)] =
-                block.ints[static_cast<size_t>(i * block.valuesPerPatch + j)] / 1000.0;
-    return RowTable(spectra);
 }
 
 namespace {
@@ -132,19 +152,6 @@ std::vector<std::vector<double>> syntheticForm(int variant)
     return form;
 }
 
-MeasurementBlock syntheticBlock(int variant)
-{
-    MeasurementBlock block;
-    block.count = 46;
-    block.ints.assign(VM_EXCHANGE_BUFFER_INTS, 0);
-    const auto form = syntheticForm(variant);
-    for (int i = 0; i < 46; ++i)
-        for (int b = 0; b < 36; ++b)
-            block.ints[static_cast<size_t>(i * 36 + b)] =
-                static_cast<int>(std::lround(form[static_cast<size_t>(i)][static_cast<size_t>(b)] * 1000.0));
-    return block;
-}
-
 TempDir::TempDir()
 {
     char pattern[] = "/tmp/veltmarquist-test-XXXXXX";
@@ -156,9 +163,8 @@ TempDir::TempDir()
 
 TempDir::~TempDir()
 {
-    const std::string command = "rm -rf '" + dir_ + "'";
-    if (std::system(command.c_str()) != 0)
-        std::fprintf(stderr, "could not remove %s\n", dir_.c_str());
+    std::error_code ignored;
+    std::filesystem::remove_all(dir_, ignored);
 }
 
 std::vector<std::string> lines(const std::string& text)

@@ -1,10 +1,14 @@
-// Helpers shared by the unit tests: golden inputs, row tables, synthetic test
-// forms with realistic inks, temporary folders and file comparison.
+// Helpers shared by the unit tests: golden inputs, CalculateChart calls, row
+// tables, synthetic test forms with realistic inks, a failing scratch
+// allocator, temporary folders and chart lines.
 #ifndef VELTMARQUIST_TESTSUPPORT_H
 #define VELTMARQUIST_TESTSUPPORT_H
 
 #include "MathProfile.h"
+#include "ScratchAllocation.h"
 
+#include <cstdlib>
+#include <filesystem>
 #include <memory>
 #include <string>
 #include <vector>
@@ -22,16 +26,25 @@ struct MeasurementBlock {
 
 // Reads a golden "*.in" file: "kind first valuesPerPatch count ints", then the ints.
 MeasurementBlock readGoldenInput(const std::string& name);
+// The block with the host's golden separations in its exchange records (process 6).
+MeasurementBlock withSeparations(MeasurementBlock block);
 std::string goldenPath(const std::string& name);
 std::string readFile(const std::string& path);
-bool fileExists(const std::string& path);
+inline bool fileExists(const std::string& path) { std::error_code e; return std::filesystem::exists(path, e); }
+
+// CalculateChart with the block's layout.
+int calculateBlock(void* profile, int process, const std::string& path, MeasurementBlock& block);
+// The chart of one call on a fresh profile; a test failure and "" when the status is not 0.
+std::string chartOf(MeasurementBlock block, int process);
+
+// The spectra of a kind-10, 380 nm, 36-band block (values / 1000).
+std::vector<std::vector<double>> spectraOf(const MeasurementBlock& block);
 
 // A row table as CalculateChart builds it: 2000 entries, rows 0..n-1 present.
 class RowTable {
 public:
     explicit RowTable(const std::vector<std::vector<double>>& spectra);
-    // Rows from a kind-10, 380 nm, 36-band block (values / 1000).
-    static RowTable fromBlock(const MeasurementBlock& block);
+    static RowTable fromBlock(const MeasurementBlock& block) { return RowTable(spectraOf(block)); }
     double** rows() { return table_.data(); }
     std::vector<double>& row(int i) { return storage_[static_cast<size_t>(i)]; }
 
@@ -45,8 +58,15 @@ private:
 // spectra, Yule-Nielsen halftones with dot gain, imperfect trapping).
 // `variant` changes dot gain and trapping so several realistic forms exist.
 std::vector<std::vector<double>> syntheticForm(int variant = 0);
-// The same form as a kind-10 block (reflectance x 1000, rounded).
-MeasurementBlock syntheticBlock(int variant = 0);
+
+// While it lives, the scratch allocator counts the buffers and fails the nth (none for 0).
+struct FailingAllocation {
+    explicit FailingAllocation(int nth) : previous(scratch::setAllocator(allocate)) { seen = 0, failing = nth; }
+    ~FailingAllocation() { scratch::setAllocator(previous); }
+    static void* allocate(std::size_t n, std::size_t s) { return ++seen == failing ? nullptr : std::calloc(n, s); }
+    static inline int seen = 0, failing = 0;
+    scratch::Allocator previous;
+};
 
 // A fresh temporary folder, removed with the object.
 class TempDir {

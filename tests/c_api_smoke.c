@@ -34,11 +34,6 @@ int main(int argc, char **argv)
     profile = CreateMathProfile("C host");
     if (profile == NULL)
         return 1;
-    status = CalculateChart(profile, VM_PROCESS_CHART_COPY, path, block, 15, 380, 36, 3);
-    if (status != VM_STATUS_UNKNOWN_INPUT_KIND) {
-        fprintf(stderr, "unknown input kind gave %d\n", status);
-        return 1;
-    }
     status = CalculateChart(profile, VM_PROCESS_CHART_COPY, path, block, VM_INPUT_10NM, 380, 36, 3);
     DestroyMathProfile(profile);
     DestroyMathProfile(NULL);

@@ -1,6 +1,5 @@
 // Patch matching and the test form found by it, from golden test forms written as CGATS.
-#include "../TestSupport.h"
-#include "Cgats.h"
+#include "GoldenForms.h"
 #include "MeasurementFile.h"
 #include "PatchMatching.h"
 #include "TestForm.h"
@@ -16,25 +15,6 @@ namespace ts = testsupport;
 
 namespace {
 
-// The 46 patches of a golden four-colour input as a CGATS document, reflectance 0-1 as "0.512".
-cgats::Document goldenForm(const ts::MeasurementBlock& block)
-{
-    cgats::Document form;
-    form.fields = {"SAMPLE_ID", "CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K"};
-    for (int j = 0; j < block.valuesPerPatch; ++j)
-        form.fields.push_back(block.inputKind == 20 ? "nm" + std::to_string(400 + 20 * j)
-                                                    : "SPECTRAL_NM" + std::to_string(block.firstWavelength + 10 * j));
-    for (int patch = 0; patch < 46; ++patch) {
-        std::vector<std::string> row{std::to_string(patch + 1)};
-        for (int channel = 0; channel < 4; ++channel)
-            row.push_back(std::to_string(MathProfile::dithering[patch][channel]));
-        for (int j = 0; j < block.valuesPerPatch; ++j)
-            row.push_back(std::to_string(block.ints[static_cast<size_t>(patch * block.valuesPerPatch + j)] / 1e3));
-        form.rows.push_back(std::move(row));
-    }
-    return form;
-}
-
 MeasurementBlock blockOf(const cgats::Document& form)
 {
     ReadResult read = readMeasurementText(cgats::write(form));
@@ -49,7 +29,7 @@ TEST(PatchMatching, ShuffledRepeatedAndNearbyPatchesGiveTheGoldenBlock)
     for (const char* name : {"offset-form.in", "offset-form-k20.in"}) {
         SCOPED_TRACE(name);
         const ts::MeasurementBlock golden = ts::readGoldenInput(name);
-        cgats::Document form = goldenForm(golden);
+        cgats::Document form = ts::goldenForm(golden);
         // Every patch measured three times, identically: the block is the golden one to the last int.
         cgats::Document thrice = form;
         for (int copy = 0; copy < 2; ++copy)
@@ -76,7 +56,7 @@ TEST(PatchMatching, ShuffledRepeatedAndNearbyPatchesGiveTheGoldenBlock)
 
 TEST(PatchMatching, EveryMissingPatchIsNamedInOneLine)
 {
-    cgats::Document form = goldenForm(ts::readGoldenInput("offset-form.in"));
+    cgats::Document form = ts::goldenForm(ts::readGoldenInput("offset-form.in"));
     form.rows.erase(form.rows.begin() + 17, form.rows.begin() + 20);
     const ReadResult read = readMeasurementText(cgats::write(form));
     ASSERT_TRUE(read.ok()) << read.error.describe();

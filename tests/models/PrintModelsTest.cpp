@@ -2,19 +2,15 @@
 // 1 predicted patch by patch in a batch and one by one and written by the
 // library's chart writer from values, the refusals, and the statuses of the
 // C entry points.
-#include "ScratchAllocation.h"
 #include "TestSupport.h"
 #include "models/PrintModels.h"
 
 #include <gtest/gtest.h>
 
 #include <cmath>
-#include <cstdlib>
 #include <cstring>
 #include <functional>
 #include <limits>
-#include <locale>
-#include <sstream>
 
 using namespace testsupport;
 using namespace veltmarquist;
@@ -120,28 +116,18 @@ TEST(PrintModels, RefuseCoveragesTheyDoNotPredictAndWriteNothing)
         return "predicted";
     };
     for (const auto& c : cases) {
+        SCOPED_TRACE(c.message);
         EXPECT_EQ(refusal([&] { c.model->predict(c.cmyk); }), c.message);
         // In a batch the refused patch is named, and nothing is written.
         const double batch[8] = {0, 0, 0, 0, c.cmyk[0], c.cmyk[1], c.cmyk[2], c.cmyk[3]};
         std::vector<double> spectra(72, -7.0);
         EXPECT_EQ(refusal([&] { c.model->predict(2, batch, spectra.data(), nullptr, nullptr); }),
                   "patch 1: " + c.message);
-        EXPECT_EQ(spectra, std::vector<double>(72, -7.0)) << c.message;
+        EXPECT_EQ(spectra, std::vector<double>(72, -7.0)) << "written before the refusal";
     }
     EXPECT_EQ(refusal([] { MeasuredForm(std::vector<Spectrum>(45)); }),
               "a measured form holds the 46 spectra of the test form; 45 were given");
 }
-
-namespace {
-
-// While it lives, every scratch buffer fails.
-struct NoScratchMemory {
-    NoScratchMemory() : previous(scratch::setAllocator([](std::size_t, std::size_t) -> void* { return nullptr; })) {}
-    ~NoScratchMemory() { scratch::setAllocator(previous); }
-    scratch::Allocator previous;
-};
-
-} // namespace
 
 TEST(PrintModelEntryPoints, StatusesAsDocumented)
 {
@@ -166,7 +152,7 @@ TEST(PrintModelEntryPoints, StatusesAsDocumented)
         {"fit: null model pointer", [&] { return fit(0, 10, 36, 46, ints, nullptr); }, 7},
         {"fit: null measurements", [&] { return fit(0, 10, 36, 46, nullptr, &handle); }, 4},
         {"fit: 45 patches", [&] { return fit(1, 10, 36, 45, ints, &handle); }, 4},
-        {"fit: no scratch memory", [&] { NoScratchMemory none; return fit(0, 10, 36, 46, ints, &handle); }, 5},
+        {"fit: no scratch memory", [&] { FailingAllocation none(1); return fit(0, 10, 36, 46, ints, &handle); }, 5},
         {"predict: null model", [&] { return PredictPrintModel(nullptr, 1, levels, nullptr, nullptr, Lab); }, 7},
         {"predict: count -1", [&] { return PredictPrintModel(handle, -1, levels, nullptr, nullptr, Lab); }, 7},
         {"predict: null coverages", [&] { return PredictPrintModel(handle, 1, nullptr, nullptr, nullptr, Lab); }, 7},
