@@ -228,9 +228,9 @@ std::string splitSwatch(const DisplayColour& left, const DisplayColour& right, c
 
 std::string clipLegend()
 {
-    return "<span class=\"legend\"><svg xmlns=\"http://www.w3.org/2000/svg\" width=\"12\" height=\"12\" "
-           "viewBox=\"0 0 12 12\"><path d=\"M6 1l5 5l-5 5l-5 -5z\" fill=\"#000000\"/></svg> outside the sRGB gamut: "
-           "shown clipped, so the swatch is less saturated than the colour</span>";
+    return "<span class=\"legend\">" + svgStart(12, 12, "clip mark") +
+           "<path d=\"M6 1l5 5l-5 5l-5 -5z\" fill=\"#000000\"/></svg> outside the sRGB gamut: shown clipped, so the "
+           "swatch is less saturated than the colour</span>";
 }
 
 } // namespace veltmarquist::html
