@@ -104,6 +104,10 @@ void runChart(const ChartOptions& options, ChartResult& result)
     FittedModel fit = fitChosenModel(form, options.process, options.fitGravure, options.yuleNielsen);
     const std::vector<Cmyk> chart = characterisationChart();
     std::vector<Triple> predicted = predictXYZ(*fit.model, chart);
+    // Without a chart, whose writing refuses a value that is not finite, the
+    // report refuses it the same way.
+    if (!output)
+        refuseNonFiniteData(xyzChartText(chart, predicted), report->name());
     if (output && libraryChart && !options.yuleNielsen) {
         writeLibraryChart(options, form, *output);
     } else if (output) {

@@ -42,7 +42,7 @@ table.facts th { width: 17em; font-weight: 500; color: var(--muted); }
 ul.words li { margin: 3px 0; }
 .warning { color: #8a3b00; }
 .swatches { display: flex; flex-wrap: wrap; gap: 8px 10px; align-items: flex-start; margin: 4px 0 10px; }
-.swatches .group { min-width: 7em; font-weight: 600; font-size: 13px; padding-top: 18px; }
+.swatches .group { flex: 0 0 9.5em; font-weight: 600; font-size: 13px; padding-top: 18px; }
 figure.patch { margin: 0; width: 88px; text-align: center; font-size: 12px; line-height: 1.25; }
 figure.patch svg { display: block; }
 figure.patch strong { color: var(--ink); }
@@ -69,6 +69,7 @@ svg .dot { stroke: #6b6b70; stroke-width: 0.5; }
 svg .hull-measured { stroke: #000000; stroke-width: 1.4; fill: none; }
 svg .hull-predicted { stroke: #0072B2; stroke-width: 1.4; stroke-dasharray: 6 3; fill: none; }
 svg .rank { font-size: 10px; font-weight: 700; }
+svg text.small { font-size: 10px; fill: var(--muted); }
 svg .ink-0 { stroke: #0072B2; } svg .ink-1 { stroke: #CC79A7; } svg .ink-2 { stroke: #E69F00; }
 svg .ink-3 { stroke: #000000; }
 .key { display: inline-block; width: 26px; height: 0; vertical-align: middle; margin: 0 4px 0 12px; }
@@ -97,7 +98,7 @@ table.heat th { text-align: center; font-size: 12px; white-space: nowrap; paddin
   figure, table.heat, tr, .figure { break-inside: avoid; }
   .plots { grid-template-columns: repeat(3, 1fr); }
   .plots.wide { grid-template-columns: 1fr; }
-  .heatmaps { grid-template-columns: 1fr 1fr; }
+  .heatmaps { grid-template-columns: 1fr; }
 }
 )";
 

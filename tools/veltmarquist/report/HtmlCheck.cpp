@@ -42,12 +42,15 @@ std::string cmykText(const Cmyk& cmyk)
 
 std::string histogram(const std::vector<CheckedPatch>& check, const Summary& summary)
 {
-    const double width = summary.max <= 4.0 ? 0.25 : summary.max <= 8.0 ? 0.5 : 1.0;
-    const size_t bins = std::max<size_t>(1, static_cast<size_t>(std::ceil(summary.max / width)));
+    // About twenty bins of 0.01, 0.02, 0.05, 0.1, ... up to the largest difference.
+    const double largest = std::isfinite(summary.max) ? summary.max : 0.0;
+    const double width = largest > 0.0 ? niceStep(largest, 20) : 0.1;
+    const size_t bins = std::max<size_t>(1, static_cast<size_t>(std::ceil(largest / width)));
     std::vector<size_t> counts(bins, 0);
     for (const CheckedPatch& patch : check)
-        ++counts[std::min(bins - 1, static_cast<size_t>(std::max(0.0, patch.deltaE2000) / width))];
-    const size_t most = *std::max_element(counts.begin(), counts.end());
+        if (std::isfinite(patch.deltaE2000))
+            ++counts[std::min(bins - 1, static_cast<size_t>(std::max(0.0, patch.deltaE2000) / width))];
+    const size_t most = std::max<size_t>(1, *std::max_element(counts.begin(), counts.end()));
     const double step = niceStep(static_cast<double>(most), 5);
     const double top = std::ceil(static_cast<double>(most) / step) * step;
     const double right = width * static_cast<double>(bins);
@@ -67,10 +70,10 @@ std::string histogram(const std::vector<CheckedPatch>& check, const Summary& sum
     }
     description += " mean " + fixed(summary.mean, 2) + ", 95th percentile " + fixed(summary.p95, 2) + ", max " +
                    fixed(summary.max, 2) + ".";
-    const double xStep = niceStep(right, 8);
+    const double xStep = niceStep(right, 7);
     return "<figure class=\"plot\"><figcaption>How large the differences are</figcaption>" +
            plot.start("Histogram and cumulative share of CIEDE2000 differences", description) +
-           plot.axes(svg::ticks({0, std::floor(right / xStep) * xStep}, xStep), xStep < 1 ? 2 : 0,
+           plot.axes(svg::ticks({0, std::floor(right / xStep) * xStep}, xStep), xStep < 0.1 ? 2 : xStep < 1 ? 1 : 0,
                      std::string(kDeltaE00Text) + " (CIEDE2000)", svg::ticks({0, top}, step), 0, "combinations") +
            plot.rightAxis({0, 100}, svg::ticks({0, 100}, 20), 0, "cumulative share (%)") + bars +
            cumulative.polyline(curve, "cumulative") + plot.line(summary.mean, 0, summary.mean, top, "mean") +

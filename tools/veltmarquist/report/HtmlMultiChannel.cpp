@@ -102,25 +102,41 @@ std::string chartSection(const MultiChannelResult& result)
            "<p>" + clipLegend() + "</p>\n" + swatches + "</div>\n" + table + sectionEnd();
 }
 
+// One strip per ink, 0 to 100 % in steps of 5 %, the tone and L* under each step.
 std::string rampsSection(const MultiChannelResult& result)
 {
+    constexpr int kCell = 46, kHeight = 64;
     std::string out = sectionStart("ramps", "4 Tone ramps",
-                                   "Each ink's ramp from paper (0 %) to solid (100 %) in steps of 5 %, with L* "
-                                   "under each step, as the model interpolates it.");
+                                   "Each ink's ramp from paper (0 %) to solid (100 %) in steps of 5 %, as the model "
+                                   "interpolates it, with the tone and L* under each step.");
     for (size_t channel = 0; channel < result.ramps.size(); ++channel) {
         const std::vector<ColouredSpectrum>& ramp = result.ramps[channel];
         const std::string name = inkName(result.inks, channel);
+        std::string cells, description = "Tone (%): L* a* b*.";
+        for (size_t tone = 0; tone < ramp.size(); tone += 5) {
+            const DisplayColour colour = srgbOfXYZ(ramp[tone].XYZ);
+            const std::string x = std::to_string(static_cast<int>(tone / 5) * kCell);
+            const std::string middle = std::to_string(static_cast<int>(tone / 5) * kCell + kCell / 2);
+            cells += "<rect x=\"" + x + "\" width=\"" + std::to_string(kCell) + "\" height=\"30\" fill=\"" +
+                     colour.hex() + "\"/>" +
+                     (colour.clipped ? "<path d=\"M" + std::to_string(std::stoi(x) + kCell - 8) +
+                                           " 3l5 5l-5 5l-5 -5z\" fill=\"" +
+                                           (colour.luminance() > 0.35 ? "#000000" : "#ffffff") + "\"/>"
+                                     : "") +
+                     "<text x=\"" + middle + "\" y=\"44\" text-anchor=\"middle\" class=\"small\">" +
+                     std::to_string(tone) + "</text><text x=\"" + middle + "\" y=\"58\" text-anchor=\"middle\">" +
+                     fixed(ramp[tone].lab.L, 1) + "</text>";
+            description += " " + std::to_string(tone) + ": " + fixed(ramp[tone].lab.L, 1) + " " +
+                           fixed(ramp[tone].lab.a, 1) + " " + fixed(ramp[tone].lab.b, 1) + ";";
+        }
+        const std::string width = std::to_string(21 * kCell);
         out += "<div class=\"swatches\" id=\"ramp-" + std::to_string(channel + 1) + "\"><div class=\"group\">" +
-               text(name) + "</div>\n";
-        for (size_t tone = 0; tone < ramp.size(); tone += 5)
-            out += "<figure class=\"patch small\">" +
-                   swatch(srgbOfXYZ(ramp[tone].XYZ),
-                          name + " " + std::to_string(tone) + " %: " + labText(ramp[tone].lab), 44, 30) +
-                   "<figcaption>" + std::to_string(tone) + "<br/>" + fixed(ramp[tone].lab.L, 1) +
-                   "</figcaption></figure>\n";
-        out += "</div>\n";
+               text(name) + "</div><svg xmlns=\"http://www.w3.org/2000/svg\" width=\"" + width + "\" height=\"" +
+               std::to_string(kHeight) + "\" viewBox=\"0 0 " + width + " " + std::to_string(kHeight) +
+               "\" role=\"img\"><title>" + text(name) + " ramp</title><desc>" + description + "</desc>" + cells +
+               "</svg></div>\n";
     }
-    return out + sectionEnd();
+    return out + "<p class=\"note\">Under each step: tone (%) and L*.</p>\n" + sectionEnd();
 }
 
 } // namespace
