@@ -140,14 +140,8 @@ void runChart(const ChartOptions& options, ChartResult& result)
     // Chart and report are both written before either is delivered.
     if (report)
         report->write(htmlReport(result));
-    if (output) {
-        output->commit();
-        result.written = output->name();
-    }
-    if (report) {
-        report->commit();
-        result.reportWritten = report->name();
-    }
+    deliver(output ? &*output : nullptr, result.written);
+    deliver(report ? &*report : nullptr, result.reportWritten);
 }
 
 } // namespace veltmarquist

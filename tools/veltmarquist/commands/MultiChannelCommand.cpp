@@ -248,22 +248,10 @@ void runMultiChannel(const MultiChannelOptions& options, MultiChannelResult& res
     result.separationsPath = options.separations;
     if (report)
         report->write(htmlReport(result));
-    if (!options.output.empty()) {
-        chart.commit();
-        result.chartWritten = chart.name();
-    }
-    if (combinations) {
-        combinations->commit();
-        result.combinationsWritten = combinations->name();
-    }
-    if (separated) {
-        separated->commit();
-        result.separatedWritten = separated->name();
-    }
-    if (report) {
-        report->commit();
-        result.reportWritten = report->name();
-    }
+    deliver(options.output.empty() ? nullptr : &chart, result.chartWritten);
+    deliver(combinations.get(), result.combinationsWritten);
+    deliver(separated.get(), result.separatedWritten);
+    deliver(report.get(), result.reportWritten);
 }
 
 } // namespace veltmarquist

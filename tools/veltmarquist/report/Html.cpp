@@ -179,7 +179,7 @@ std::string sectionEnd()
     return "</section>\n";
 }
 
-std::string row(const std::vector<std::string>& cells, bool header)
+std::string row(const std::vector<std::string>& cells)
 {
     std::string out = "<tr>";
     for (const std::string& cell : cells) {
@@ -194,9 +194,16 @@ std::string row(const std::vector<std::string>& cells, bool header)
         }
         const bool number = shown.find_first_of("0123456789") != std::string::npos &&
                             shown.find_first_not_of("0123456789+-. ()%") == std::string::npos;
-        out += std::string(header ? "<th" : "<td") + (number ? " class=\"num\">" : ">") + cell +
-               (header ? "</th>" : "</td>");
+        out += std::string(number ? "<td class=\"num\">" : "<td>") + cell + "</td>";
     }
+    return out + "</tr>\n";
+}
+
+std::string headerRow(const std::vector<std::string>& cells, size_t numbersFrom)
+{
+    std::string out = "<tr>";
+    for (size_t i = 0; i < cells.size(); ++i)
+        out += std::string(i >= numbersFrom ? "<th class=\"num\">" : "<th>") + cells[i] + "</th>";
     return out + "</tr>\n";
 }
 

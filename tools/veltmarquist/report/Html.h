@@ -33,8 +33,11 @@ std::string pageEnd();
 std::string sectionStart(const std::string& id, const std::string& heading, const std::string& lead = "");
 std::string sectionEnd();
 
-// A table row of header (th) or data (td) cells, each already HTML.
-std::string row(const std::vector<std::string>& cells, bool header = false);
+// A table row of data cells, each already HTML; a cell that holds a number is
+// right-aligned.
+std::string row(const std::vector<std::string>& cells);
+// A row of header cells; those from `numbersFrom` on head columns of numbers.
+std::string headerRow(const std::vector<std::string>& cells, size_t numbersFrom);
 
 // A small SVG of one colour, or of two side by side (left, right), with
 // `title` as its tooltip and text; a clipped colour carries a diamond mark.

@@ -244,9 +244,9 @@ std::string errorMap(const std::vector<CheckedPatch>& check)
 std::string worstTable(const std::vector<CheckedPatch>& check, const std::vector<size_t>& worst)
 {
     std::string out = "<table id=\"worst\">\n" +
-                      row({"#", "C M Y K", "measured | predicted", "measured L* a* b*", "predicted L* a* b*",
-                           kDeltaE00, "\xCE\x94" "E*ab"},
-                          true);
+                      headerRow({"#", "C M Y K", "measured | predicted", "measured L* a* b*", "predicted L* a* b*",
+                                 kDeltaE00, "\xCE\x94" "E*ab"},
+                                3);
     for (size_t rank = 0; rank < worst.size(); ++rank) {
         const CheckedPatch& patch = check[worst[rank]];
         const auto lab = [](const Lab& value) {

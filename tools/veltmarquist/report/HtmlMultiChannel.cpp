@@ -53,7 +53,7 @@ std::string solidsSection(const MultiChannelResult& result)
 {
     const std::vector<std::string> names = channelNames(result.inks);
     std::string swatches = "<div class=\"swatches\">\n", table = "<table id=\"solids\">\n" +
-                                                                  row({"", "L*", "a*", "b*"}, true);
+                                                                  headerRow({"", "L*", "a*", "b*"}, 1);
     std::vector<SpectrumPanel> panels;
     const ChannelPatch& paper = result.paperAndSolids.front();
     for (size_t i = 0; i < result.paperAndSolids.size(); ++i) {
@@ -90,7 +90,7 @@ std::string chartSection(const MultiChannelResult& result)
                     "<figcaption>" + std::to_string(i + 1) + "</figcaption></figure>\n";
         if (i % perColumn == 0)
             table += (i == 0 ? "" : "</table>\n") + std::string("<table>\n") +
-                     row({"#", "channels (%)", "L*", "a*", "b*"}, true);
+                     headerRow({"#", "channels (%)", "L*", "a*", "b*"}, 2);
         table += row({std::to_string(i + 1), text(channels), fixed(patch.colour.lab.L, 1),
                       fixed(patch.colour.lab.a, 1), fixed(patch.colour.lab.b, 1)});
     }

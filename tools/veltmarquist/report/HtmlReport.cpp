@@ -179,7 +179,7 @@ std::string checkFigures(const ChartResult& result)
                       "combination the file measured beyond the test form" +
                       std::string(everyCoverage ? "" : " that the chart holds") + " (repeats averaged). " +
                       kDeltaE00 + " by LittleCMS.</p>\n<table id=\"check-figures\">\n" +
-                      row({"Combinations", "count", std::string("mean ") + kDeltaE00, "95th percentile", "max"}, true);
+                      headerRow({"Combinations", "count", std::string("mean ") + kDeltaE00, "95th percentile", "max"}, 1);
     out += checkRow(everyCoverage ? "all beyond the form" : "chart combinations beyond the form",
                     result.checkSummary.deltaE2000, "check");
     if (everyCoverage && result.chartCheckSummary.deltaE2000.count > 0)
@@ -344,7 +344,7 @@ std::string toneValueSection(const ModelledForm& form)
     for (double level : form.toneValues[0].nominal)
         if (level > 0.0 && level < 100.0)
             header.push_back(fixed(level, 0) + " %");
-    table = "<table id=\"tone-values-table\">\n" + row(header, true);
+    table = "<table id=\"tone-values-table\">\n" + headerRow(header, 2);
     for (size_t ink = 0; ink < 4; ++ink) {
         const ToneValueCurve& curve = form.toneValues[ink];
         std::string description = "Measured tone value (%) at nominal coverage:";

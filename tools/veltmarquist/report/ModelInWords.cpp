@@ -59,6 +59,8 @@ std::vector<std::string> gravureWords(const FittedModel& fit)
     std::vector<std::string> words;
     if (order.size() != 4 || factor.size() < 3)
         return words;
+    words.push_back("Ink order " + std::string(1, order[0]) + ", " + order[1] + ", " + order[2] + ", " + order[3] +
+                    ": " + order[0] + " prints first.");
     const char* const positions[3] = {"second", "third", "fourth"};
     double strength = 1.0;
     std::string below(1, order[0]);
