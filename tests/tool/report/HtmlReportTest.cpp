@@ -87,7 +87,7 @@ const std::vector<std::pair<const char*, double>> kFourColour = {
     {"//h:section[@id='tone-values']//s:svg", 4},
 };
 const std::vector<std::pair<const char*, double>> kChecked = {
-    {"//h:section[@id='check']", 1}, {"//h:table[@id='worst']/h:tr", 16}, {"//h:table[starts-with(@id, 'error-map')]", 4}};
+    {"//h:section[@id='check']", 1}, {"//h:table[@id='worst']/h:tr", 16}, {"//*[starts-with(@id, 'error-map')]", 4}};
 
 std::vector<std::pair<const char*, double>> operator+(std::vector<std::pair<const char*, double>> a,
                                                       const std::vector<std::pair<const char*, double>>& b)

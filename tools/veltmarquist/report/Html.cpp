@@ -38,7 +38,9 @@ table { border-collapse: collapse; font-variant-numeric: tabular-nums; margin: 6
 th, td { padding: 3px 8px; border-bottom: 1px solid var(--rule); text-align: left; vertical-align: top; }
 th { font-weight: 600; font-size: 13px; }
 td.num, th.num { text-align: right; white-space: nowrap; }
-table.facts th { width: 17em; font-weight: 500; color: var(--muted); }
+table.facts th, table.facts td:first-child { width: 15em; font-weight: 500; color: var(--muted); }
+table.facts td.num { text-align: left; }
+#tone-values-table td:first-child, #worst td:nth-child(2) { white-space: nowrap; }
 ul.words li { margin: 3px 0; }
 .warning { color: #8a3b00; }
 .swatches { display: flex; flex-wrap: wrap; gap: 8px 10px; align-items: flex-start; margin: 4px 0 10px; }
@@ -96,7 +98,17 @@ table.heat th { text-align: center; font-size: 12px; white-space: nowrap; paddin
   section#summary { break-before: auto; }
   h2 { border-top: none; margin-top: 0; }
   figure, table.heat, tr, .figure { break-inside: avoid; }
-  .plots { grid-template-columns: repeat(3, 1fr); }
+  .plots { grid-template-columns: repeat(4, 1fr); gap: 4px 8px; }
+  table { font-size: 8.5pt; }
+  .figures { gap: 6px; margin: 8px 0; }
+  .figure { padding: 3px 8px; min-width: 0; }
+  .figure .value { font-size: 15pt; }
+  figure.patch { width: 64px; font-size: 8pt; }
+  figure.patch svg { width: 64px; height: 43px; }
+  figure.small, figure.small svg { width: 34px; }
+  figure.small svg { height: 23px; }
+  .swatches { gap: 6px; }
+  .swatches .group { flex-basis: 6.5em; }
   .plots.wide { grid-template-columns: 1fr; }
   .heatmaps { grid-template-columns: 1fr; }
 }

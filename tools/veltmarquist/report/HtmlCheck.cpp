@@ -79,7 +79,7 @@ std::string histogram(const std::vector<CheckedPatch>& check, const Summary& sum
            cumulative.polyline(curve, "cumulative") + plot.line(summary.mean, 0, summary.mean, top, "mean") +
            plot.line(summary.p95, 0, summary.p95, top, "p95") +
            plot.label(summary.mean, top, "mean " + fixed(summary.mean, 2), "", "start", 4, 10) +
-           plot.label(summary.p95, top, "95 % " + fixed(summary.p95, 2), "", "start", 4, 24) + svg::Plot::end() +
+           plot.label(summary.p95, top, "p95 " + fixed(summary.p95, 2), "", "start", 4, 24) + svg::Plot::end() +
            "<p class=\"legend\"><span class=\"key bar\"></span>combinations per bin of " + fixed(width, 2) +
            "<span class=\"key cumulative\"></span>share at or below (right axis)<span class=\"key mean\"></span>mean"
            "<span class=\"key p95\"></span>95th percentile</p></figure>\n";
@@ -143,6 +143,11 @@ std::string abPlane(const std::vector<CheckedPatch>& check, const std::vector<si
     description += " predicted:";
     for (const auto& [a, b] : predictedHull)
         description += " " + fixed(a, 1) + " " + fixed(b, 1) + ";";
+    description += " Each combination, a* b* measured > predicted:";
+    for (size_t i = 0; i < check.size(); ++i)
+        description += " " + cmykText(check[i].device) + " " + fixed(measured[i].first, 1) + " " +
+                       fixed(measured[i].second, 1) + " > " + fixed(predicted[i].first, 1) + " " +
+                       fixed(predicted[i].second, 1) + ";";
     return "<figure class=\"plot\"><figcaption>Where in colour space: a*b* plane</figcaption>" +
            plot.start("Measured and predicted colours in the a*b* plane", description) +
            plot.axes(svg::ticks({-reach, reach}, step), 0, "a*", svg::ticks({-reach, reach}, step), 0, "b*") +
@@ -199,8 +204,13 @@ std::string errorMap(const std::vector<CheckedPatch>& check)
                                           "Black 86\xE2\x80\x93" "100 %"};
     std::string out = "<div class=\"heatmaps\">\n";
     for (size_t k = 0; k < 4; ++k) {
-        out += "<table class=\"heat\" id=\"error-map-k" + std::to_string(k) + "\"><caption>" + blacks[k] +
-               "</caption>\n<tr><th></th>";
+        const std::string id = "error-map-k" + std::to_string(k);
+        if (std::all_of(check.begin(), check.end(),
+                        [&](const CheckedPatch& patch) { return blackRangeOf(patch.device[3]) != k; })) {
+            out += "<p class=\"note\" id=\"" + id + "\">" + blacks[k] + ": no combination measured.</p>\n";
+            continue;
+        }
+        out += "<table class=\"heat\" id=\"" + id + "\"><caption>" + blacks[k] + "</caption>\n<tr><th></th>";
         for (size_t m = 0; m < kBins; ++m)
             out += std::string("<th colspan=\"3\">M ") + kBinNames[m] + " %</th>";
         out += "</tr>\n<tr><th></th>";

@@ -340,15 +340,16 @@ std::string toneValueSection(const ModelledForm& form)
     const svg::Plot plot(290, 270, {0, 100}, {0, 100});
     const char* const shapes[4] = {"circle", "square", "diamond", "triangle"};
     std::string plots = "<div class=\"plots\">\n", table;
-    std::vector<std::string> header{"Ink", "channel"};
+    std::vector<std::string> header{"Ink (channel)"};
     for (double level : form.toneValues[0].nominal)
         if (level > 0.0 && level < 100.0)
             header.push_back(fixed(level, 0) + " %");
-    table = "<table id=\"tone-values-table\">\n" + headerRow(header, 2);
+    table = "<table id=\"tone-values-table\">\n" + headerRow(header, 1);
     for (size_t ink = 0; ink < 4; ++ink) {
         const ToneValueCurve& curve = form.toneValues[ink];
         std::string description = "Measured tone value (%) at nominal coverage:";
-        std::vector<std::string> cells{kInkNames[ink], text(densitometerChannel(static_cast<int>(ink)))};
+        std::vector<std::string> cells{std::string(kInkNames[ink]) + "<br/><span class=\"note\">" +
+                                       text(densitometerChannel(static_cast<int>(ink))) + "</span>"};
         svg::Points model;
         for (size_t i = 0; i < curve.modelNominal.size(); ++i)
             model.emplace_back(curve.modelNominal[i], curve.modelled[i]);
