@@ -216,8 +216,10 @@ std::string summarySection(const ChartResult& result, const Summary& form)
                                                                   std::to_string(found.picked.averaged) + " of them"
                                                             : "")}) +
            row({"Other measurements", std::to_string(found.picked.setsIgnored) +
-                                          (result.check.empty() ? " (none of them a combination the check can use)"
-                                                                : " (the check below uses them)")}) +
+                                          (result.check.empty()
+                                               ? " (none of them a combination the check can use)"
+                                               : " (the check below compares " + std::to_string(result.check.size()) +
+                                                     " combinations among them with the model)")}) +
            "</table>\n" + warningList(result.formWarnings.warnings);
     const ModelWords words = modelInWords(fit);
     out += "<h3>The model: " + text(modelName(fit)) + "</h3>\n<p>" + text(words.how) + "</p>\n<ul class=\"words\">\n";
