@@ -72,8 +72,6 @@ svg .hull-measured { stroke: #000000; stroke-width: 1.4; fill: none; }
 svg .hull-predicted { stroke: #0072B2; stroke-width: 1.4; stroke-dasharray: 6 3; fill: none; }
 svg .rank { font-size: 10px; font-weight: 700; }
 svg text.small { font-size: 10px; fill: var(--muted); }
-svg .ink-0 { stroke: #0072B2; } svg .ink-1 { stroke: #CC79A7; } svg .ink-2 { stroke: #E69F00; }
-svg .ink-3 { stroke: #000000; }
 .key { display: inline-block; width: 26px; height: 0; vertical-align: middle; margin: 0 4px 0 12px; }
 .key.measured { border-top: 2px solid #000000; }
 .key.modelled { border-top: 2px dashed #D55E00; }

@@ -293,7 +293,7 @@ std::string formSection(const ModelledForm& form)
                                    "Each swatch shows the measured colour on the left and the model's on the right "
                                    "(D50 colours shown in sRGB through a Bradford adaptation to D65), with their " +
                                        std::string(kDeltaE00) + " below. \xE2\x96\xB2" "1 to \xE2\x96\xB2" "5 and a "
-                                       "heavy frame mark the five largest differences. ") +
+                                       "heavy frame mark the five largest differences above 0.05. ") +
                       "<p>" + clipLegend() + "</p>\n";
     std::stable_sort(paperAndGreys.begin(), paperAndGreys.end(), byCoverage);
     out += group("Paper and greys", paperAndGreys);

@@ -4,6 +4,7 @@
 #include "Html.h"
 
 #include <algorithm>
+#include <cctype>
 #include <cmath>
 
 namespace veltmarquist {

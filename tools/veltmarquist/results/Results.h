@@ -3,7 +3,8 @@
 // A command fills its result step by step as it goes: when it fails, the
 // steps it finished stay filled (and are shown before the error, as a run
 // shows them), the others stay empty. Plain values only: no printing here
-// (report/TextReport.h renders them as the terminal text).
+// (report/TextReport.h renders them as the terminal text, report/HtmlReport.h
+// as the HTML page).
 #ifndef VELTMARQUIST_TOOL_RESULTS_H
 #define VELTMARQUIST_TOOL_RESULTS_H
 
