@@ -8,6 +8,8 @@ packages=(build-essential cmake ninja-build pkg-config
           liblcms2-dev libcli11-dev
           argyll-ref icc-profiles-free  # real CGATS files the reader tests read
           argyll  # colprof, profcheck, xicclu, spec2cie: profiles from the export (stage 60-profile)
+          libxml2-dev  # the HTML report's test parses the page as XML
+          chromium  # renders the HTML report headless (stage 70-report)
           clang libclang-rt-14-dev valgrind python3
           python3-dev python3-venv python3-pip python3-setuptools python3-build python3-wheel  # the Python package
           pybind11-dev python3-pybind11 python3-numpy python3-pytest                        # (stage 80-python)

@@ -5,7 +5,7 @@
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
-stages=(20-install-examples 30-fuzz 40-tsan 50-valgrind 60-profile 80-python)
+stages=(20-install-examples 30-fuzz 40-tsan 50-valgrind 60-profile 70-report 80-python)
 
 scripts/setup.sh
 cmake --workflow --preset dev

@@ -11,10 +11,7 @@
 set -euo pipefail
 cd "$(dirname "$0")/../.."
 
-build=${VELTMARQUIST_STAGE_BUILD:-build/dev} # the dev preset's build unless told otherwise
-[ -f "$build/CMakeCache.txt" ] || cmake --preset dev >/dev/null
-cmake --build "$build" --target veltmarquist >/dev/null
-tool="$build/tools/veltmarquist"
+source scripts/stages/tool-build.sh
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
 

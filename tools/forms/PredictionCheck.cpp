@@ -4,6 +4,7 @@
 #include "LibraryBlock.h"
 #include "PatchMatching.h"
 
+#include <algorithm>
 #include <set>
 
 namespace veltmarquist {
@@ -17,9 +18,19 @@ Key keyOf(const Cmyk& cmyk)
     return CombinationIndex::keyOf(std::vector<double>(cmyk.begin(), cmyk.end()));
 }
 
-size_t blackRange(double black)
+// One batch of predictions: the X, Y, Z (N = 3) or the spectra (N = 36).
+template <size_t N>
+std::vector<std::array<double, N>> predictBatch(const PrintModel& model, const std::vector<Cmyk>& coverages)
 {
-    return black <= 0.0 ? 0 : black <= 40.0 ? 1 : black <= 85.0 ? 2 : 3;
+    std::vector<double> cmyk, values(N * coverages.size());
+    for (const Cmyk& coverage : coverages)
+        cmyk.insert(cmyk.end(), coverage.begin(), coverage.end());
+    model.predict(coverages.size(), cmyk.data(), N == 3 ? nullptr : values.data(), N == 3 ? values.data() : nullptr,
+                  nullptr);
+    std::vector<std::array<double, N>> patches(coverages.size());
+    for (size_t i = 0; i < coverages.size(); ++i)
+        std::copy_n(values.begin() + static_cast<std::ptrdiff_t>(N * i), N, patches[i].begin());
+    return patches;
 }
 
 } // namespace
@@ -39,14 +50,12 @@ CheckedPatch checkedPatch(const Cmyk& device, const Triple& measuredXYZ, const T
 
 std::vector<Triple> predictXYZ(const PrintModel& model, const std::vector<Cmyk>& coverages)
 {
-    std::vector<double> cmyk, XYZ(3 * coverages.size());
-    for (const Cmyk& coverage : coverages)
-        cmyk.insert(cmyk.end(), coverage.begin(), coverage.end());
-    model.predict(coverages.size(), cmyk.data(), nullptr, XYZ.data(), nullptr);
-    std::vector<Triple> triples;
-    for (size_t i = 0; i < coverages.size(); ++i)
-        triples.push_back({XYZ[3 * i], XYZ[3 * i + 1], XYZ[3 * i + 2]});
-    return triples;
+    return predictBatch<3>(model, coverages);
+}
+
+std::vector<Spectrum> predictSpectra(const PrintModel& model, const std::vector<Cmyk>& coverages)
+{
+    return predictBatch<kSpectrumBands>(model, coverages);
 }
 
 std::vector<Cmyk> measuredCombinations(const MeasurementFile& file)
@@ -97,6 +106,11 @@ std::vector<CheckedPatch> checkPredictions(const MeasurementFile& file, const st
     return checked;
 }
 
+size_t blackRangeOf(double black)
+{
+    return black <= 0.0 ? 0 : black <= 40.0 ? 1 : black <= 85.0 ? 2 : 3;
+}
+
 CheckSummary summariseChecks(const std::vector<CheckedPatch>& patches)
 {
     CheckSummary summary;
@@ -104,7 +118,7 @@ CheckSummary summariseChecks(const std::vector<CheckedPatch>& patches)
     std::array<std::vector<double>, 4> byBlack;
     for (size_t i = 0; i < patches.size(); ++i) {
         all.push_back(patches[i].deltaE2000);
-        byBlack[blackRange(patches[i].device[3])].push_back(patches[i].deltaE2000);
+        byBlack[blackRangeOf(patches[i].device[3])].push_back(patches[i].deltaE2000);
         if (all.back() > all[summary.largest])
             summary.largest = i;
     }

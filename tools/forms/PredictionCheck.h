@@ -33,6 +33,8 @@ CheckedPatch checkedPatch(const Cmyk& device, const Triple& measuredXYZ, const T
 // X, Y, Z (as the model gives them, Y not limited) of each coverage, in one
 // batch: the model refuses the whole batch when it does not predict one.
 std::vector<Triple> predictXYZ(const PrintModel& model, const std::vector<Cmyk>& coverages);
+// The spectra of the coverages, in one batch likewise.
+std::vector<Spectrum> predictSpectra(const PrintModel& model, const std::vector<Cmyk>& coverages);
 
 // The C, M, Y, K combinations of the file (further channels 0), each once, in
 // file order.
@@ -45,6 +47,10 @@ std::vector<Cmyk> measuredCombinations(const MeasurementFile& file);
 // levels, as on the characterisation chart).
 std::vector<CheckedPatch> checkPredictions(const MeasurementFile& file, const std::vector<Cmyk>& coverages,
                                            const PrintModel& model);
+
+// The ranges of black the summary splits the check by: 0 for K 0, 1 for
+// K 1-40, 2 for K 41-85, 3 for K 86-100 %.
+size_t blackRangeOf(double black);
 
 struct CheckSummary {
     Summary deltaE2000;

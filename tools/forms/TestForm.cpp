@@ -23,6 +23,15 @@ bool isCondition(const std::string& keyword)
 
 } // namespace
 
+std::vector<std::pair<std::string, std::string>> measurementConditions(const MeasurementFile& file)
+{
+    std::vector<std::pair<std::string, std::string>> conditions;
+    for (const auto& [keyword, value] : file.keywords)
+        if (isCondition(keyword))
+            conditions.emplace_back(keyword, value);
+    return conditions;
+}
+
 FoundForm findTestForm(const std::string& path, const ReadOptions& options)
 {
     return findTestForm(loadMeasurementFile(path, options), path);
@@ -40,9 +49,7 @@ FoundForm findTestForm(MeasurementFile file, const std::string& path)
         std::copy_n(bands.begin(), kSpectrumBands, found.spectra.back().begin());
     }
     found.block = buildBlock(spectra);
-    for (const auto& [keyword, value] : found.file.keywords)
-        if (isCondition(keyword))
-            found.conditions.emplace_back(keyword, value);
+    found.conditions = measurementConditions(found.file);
     return found;
 }
 

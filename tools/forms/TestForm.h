@@ -33,6 +33,11 @@ struct FoundForm {
     MeasuredForm measuredForm() const { return MeasuredForm(spectra); }
 };
 
+// The keywords of a file's header that state how it was measured
+// (MEASUREMENT_CONDITION, ILLUMINATION_NAME, OBSERVER_ANGLE, FILTER,
+// INSTRUMENTATION, ...), in file order.
+std::vector<std::pair<std::string, std::string>> measurementConditions(const MeasurementFile& file);
+
 // Reads `path` and finds the form. ToolErrors name the file (and line): an
 // unreadable file, a file without spectral or device fields, and every
 // missing patch at once.

@@ -447,6 +447,14 @@ void PendingOutput::deliverByCopy()
         throw ToolError(Failure::OutputUnwritable, name() + ": write failed: " + std::strerror(failure));
 }
 
+void deliver(PendingOutput* output, std::string& written)
+{
+    if (output == nullptr)
+        return;
+    output->commit();
+    written = output->name();
+}
+
 void PendingOutput::commit()
 {
     if (copy_) {

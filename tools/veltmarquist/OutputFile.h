@@ -65,6 +65,10 @@ private:
     bool committed_ = false;
 };
 
+// Delivers `output` when there is one (commit) and sets `written` to how
+// messages name it; does nothing for null.
+void deliver(PendingOutput* output, std::string& written);
+
 // Throws Failure::Calculation when the data of a chart or CGATS text (the
 // lines between BEGIN_DATA and END_DATA) holds a value that is not finite
 // (nan, inf, in any case and sign). The message names `what`, the first such

@@ -118,7 +118,7 @@ int fail(const ToolError& error, std::ostream& report)
     return exitCodeOf(error.failure());
 }
 
-const char* const kCommandNames = "chart, compare, multichannel, convert";
+const char* const kCommandNames = "chart, compare, multichannel, convert, report";
 
 // What is wrong with the command itself (the first word that is not an
 // option must name a command), or else CLI11's message as one line.
@@ -184,6 +184,8 @@ int main(int argc, char** argv)
         ->capture_default_str();
     chartCommand->add_flag("--fit-gravure", chart.fitGravure,
                            "fit the gravure ink order and trapping factors first (implies --process gravure)");
+    chartCommand->add_option("--report", chart.report,
+                             "also write the HTML report of the form, the fit and the check (as the report command)");
     addModel(*chartCommand, model);
     addScale(*chartCommand, scale);
 
@@ -216,7 +218,29 @@ int main(int argc, char** argv)
                                                          "XYZ chart of the separated combinations to write");
     separations->needs(separatedOut);
     separatedOut->needs(separations);
+    multiCommand->add_option("--report", multi.report, "also write the HTML report of paper, solids, chart and ramps");
     addScale(*multiCommand, scale);
+
+    // report: the chart command's form, fit and check (or the multichannel
+    // command's chart and ramps) as an HTML page, without a chart.
+    std::string reportForm, reportOutput;
+    int reportInks = 0;
+    bool reportFitGravure = false;
+    CLI::App* reportCommand = app.add_subcommand(
+        "report", "HTML report of a measured form: the test form, the model's fit and its check against everything "
+                  "else the file measured (or, with --inks, a multi-channel form's chart and ramps)");
+    reportCommand->add_option("FORM", reportForm, "measurement file with the 46 test-form patches (any order)")
+        ->required();
+    reportCommand->add_option("-o,--output", reportOutput, "HTML file to write")->required();
+    reportCommand->add_option("--process", processName, "print model")
+        ->check(CLI::IsMember({"offset", "gravure"}))
+        ->capture_default_str();
+    reportCommand->add_flag("--fit-gravure", reportFitGravure,
+                            "fit the gravure ink order and trapping factors first (implies --process gravure)");
+    addModel(*reportCommand, model);
+    reportCommand->add_option("--inks", reportInks, "a six- or seven-colour form (nCLR_1 ... nCLR_n fields)")
+        ->check(CLI::IsMember({6, 7}));
+    addScale(*reportCommand, scale);
 
     ConvertOptions convert;
     std::string mode = "convert";
@@ -254,8 +278,8 @@ int main(int argc, char** argv)
 
     // With an output on standard output the report goes to stderr.
     bool chartOnStandardOutput = false;
-    for (const std::string* output : {&chart.output, &multi.output, &multi.combinations, &multi.separatedOutput,
-                                      &convert.output})
+    for (const std::string* output : {&chart.output, &chart.report, &multi.output, &multi.combinations,
+                                      &multi.separatedOutput, &multi.report, &convert.output, &reportOutput})
         chartOnStandardOutput = chartOnStandardOutput || isStandardOutput(*output);
     const int reportDescriptor = chartOnStandardOutput ? STDERR_FILENO : STDOUT_FILENO;
     ReportBuffer reportBuffer(reportDescriptor);
@@ -283,6 +307,26 @@ int main(int argc, char** argv)
                 throw ToolError(Failure::Usage, "--mode " + mode + " needs --from and --to");
             convert.read = read;
             runAndRender(runConvert, renderConvert, convert, report);
+        } else if (*reportCommand && reportCommand->get_option("--inks")->count() > 0) {
+            const bool yuleNielsen = model == "ynsn";
+            if (yuleNielsen || reportFitGravure || reportCommand->get_option("--process")->count() > 0)
+                throw ToolError(Failure::Usage, "--inks reports a multi-channel form; it cannot go with --process, "
+                                                "--fit-gravure or --model");
+            MultiChannelOptions options;
+            options.form = reportForm;
+            options.inks = reportInks;
+            options.report = reportOutput;
+            options.read = read;
+            runAndRender(runMultiChannel, renderMultiChannel, options, report);
+        } else if (*reportCommand) {
+            ChartOptions options;
+            options.form = reportForm;
+            options.report = reportOutput;
+            options.fitGravure = reportFitGravure;
+            options.yuleNielsen = model == "ynsn";
+            options.process = chosenProcess(*reportCommand, processName, options.fitGravure, options.yuleNielsen);
+            options.read = read;
+            runAndRender(runChart, renderChart, options, report);
         }
     } catch (const ToolError& error) {
         return fail(error, report);

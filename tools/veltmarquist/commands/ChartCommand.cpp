@@ -14,9 +14,12 @@
 #include "LibraryBlock.h"
 #include "LibraryHost.h"
 #include "OutputFile.h"
+#include "report/HtmlReport.h"
 #include "ToolError.h"
 
 #include "ChartExport.h"
+
+#include <optional>
 
 namespace veltmarquist {
 
@@ -74,7 +77,7 @@ void runChart(const ChartOptions& options, ChartResult& result)
     std::vector<std::string> inputs{options.form};
     if (layoutFromFile)
         inputs.push_back(options.layout);
-    refuseClashingOutputs(inputs, {options.output});
+    refuseClashingOutputs(inputs, {options.output, options.report});
     exporting::ExportOptions exportOptions;
     exportOptions.format = exportStep(options.layout, [&] {
         const auto format = exporting::chartFormatNamed(options.format);
@@ -93,14 +96,22 @@ void runChart(const ChartOptions& options, ChartResult& result)
     const exporting::PatchLayout layout = exportStep(options.layout, [&] { return exporting::readLayout(options.layout); });
     if (layoutFromFile)
         result.layoutWarnings = FileWarnings{options.layout, layout.warnings};
-    PendingOutput output(options.output);
+    std::optional<PendingOutput> output, report;
+    if (!options.output.empty())
+        output.emplace(options.output);
+    if (!options.report.empty())
+        report.emplace(options.report);
     FittedModel fit = fitChosenModel(form, options.process, options.fitGravure, options.yuleNielsen);
     const std::vector<Cmyk> chart = characterisationChart();
     std::vector<Triple> predicted = predictXYZ(*fit.model, chart);
-    if (libraryChart && !options.yuleNielsen) {
-        writeLibraryChart(options, form, output);
-    } else {
-        output.write(exportStep(options.layout, [&] {
+    // Without a chart, whose writing refuses a value that is not finite, the
+    // report refuses it the same way.
+    if (!output)
+        refuseNonFiniteData(xyzChartText(chart, predicted), report->name());
+    if (output && libraryChart && !options.yuleNielsen) {
+        writeLibraryChart(options, form, *output);
+    } else if (output) {
+        output->write(exportStep(options.layout, [&] {
             return exporting::exportChart(*fit.model, exporting::provenanceOf(form.file, options.form), layout,
                                           exportOptions);
         }));
@@ -111,6 +122,7 @@ void runChart(const ChartOptions& options, ChartResult& result)
             result.format = exportOptions.format == exporting::ChartFormat::cti3 ? "CTI3" : "CGATS";
     }
     result.patches = layout.size();
+    result.modelled = modelForm(form, *fit.model);
     result.fit = std::move(fit);
     result.coverages = chart;
     result.predicted = std::move(predicted);
@@ -125,8 +137,11 @@ void runChart(const ChartOptions& options, ChartResult& result)
     result.check = checkPredictions(form.file, checked, *result.fit->model);
     result.checkSummary = summariseChecks(result.check);
     result.chartCheckSummary = summariseChecks(onChart(result.check));
-    output.commit();
-    result.written = output.name();
+    // Chart and report are both written before either is delivered.
+    if (report)
+        report->write(htmlReport(result));
+    deliver(output ? &*output : nullptr, result.written);
+    deliver(report ? &*report : nullptr, result.reportWritten);
 }
 
 } // namespace veltmarquist

@@ -19,10 +19,13 @@ namespace veltmarquist {
 // from the 46 test-form patches. By default the library's 900-patch chart:
 // process 0 or 1 of the library, or the Yule-Nielsen model written in the
 // library's layout; --format and --layout export other patches for profile
-// builders.
+// builders. With `report` it also writes the HTML report of the form, the
+// fit and the check; the report command is this without a chart (`output`
+// empty).
 struct ChartOptions {
     std::string form;
-    std::string output;
+    std::string output; // empty: no chart
+    std::string report; // empty: no HTML report
     PrintProcess process = VM_PROCESS_OFFSET;
     bool fitGravure = false;  // fit ink order and trapping factors first (gravure only)
     bool yuleNielsen = false; // the Yule-Nielsen model instead of the library's
@@ -49,11 +52,14 @@ void runCompare(const CompareOptions& options, CompareResult& result);
 // multichannel FORM --inks 6|7 -o CHART: the six- or seven-colour spectral
 // chart (process 3 or 5), the extended C, M, Y, K combinations for the
 // user's separation software, and with its separations the XYZ chart of
-// process 6, all on one profile.
+// process 6, all on one profile. With `report` it also writes the HTML report
+// of paper, solids, chart and ramps; the report command is this without a
+// chart to deliver (`output` empty).
 struct MultiChannelOptions {
     std::string form;
     int inks = 7;
-    std::string output;
+    std::string output; // empty: the chart is made for the report only
+    std::string report; // empty: no HTML report
     std::string combinations;  // optional
     std::string separations;   // optional, needs separatedOutput
     std::string separatedOutput;

@@ -26,27 +26,22 @@ void runCompare(const CompareOptions& options, CompareResult& result)
     PendingOutput modelChart(modelPath);
 
     FittedModel fit = fitChosenModel(*result.form, options.process, options.fitGravure, options.yuleNielsen);
-    const MeasuredForm form = result.form->measuredForm();
+    ModelledForm modelled = modelForm(*result.form, *fit.model);
     std::vector<Cmyk> coverages;
-    std::vector<Triple> measured;
-    for (int patch = 0; patch < MeasuredForm::kPatches; ++patch) {
-        coverages.push_back(MeasuredForm::coverageOf(patch));
-        measured.push_back(spectrumToXYZ(form.spectrum(patch)));
+    std::vector<Triple> measured, modelledXYZ;
+    std::vector<double> ab;
+    for (const FormPatch& patch : modelled.patches) {
+        coverages.push_back(patch.check.device);
+        measured.push_back(spectrumToXYZ(patch.measured));
+        modelledXYZ.push_back(spectrumToXYZ(patch.modelled));
+        ab.push_back(patch.check.deltaEab);
     }
-    const std::vector<Triple> modelled = predictXYZ(*fit.model, coverages);
     // Both charts are checked before either is delivered: both or neither.
     measuredChart.write(xyzChartText(coverages, measured));
-    modelChart.write(xyzChartText(coverages, modelled));
+    modelChart.write(xyzChartText(coverages, modelledXYZ));
     result.fit = std::move(fit);
-
-    std::vector<double> ab, de2000;
-    for (size_t i = 0; i < coverages.size(); ++i) {
-        result.patches.push_back(checkedPatch(coverages[i], chartXYZ(measured[i]), chartXYZ(modelled[i])));
-        ab.push_back(result.patches.back().deltaEab);
-        de2000.push_back(result.patches.back().deltaE2000);
-    }
+    result.modelled = std::move(modelled);
     result.deltaEab = summarise(ab);
-    result.deltaE2000 = summarise(de2000);
     measuredChart.commit();
     modelChart.commit();
     result.measuredWritten = measuredChart.name();

@@ -2,6 +2,7 @@
 #include "FourColourForm.h"
 
 #include "MeasurementLoading.h"
+#include "PredictionCheck.h"
 #include "ToolError.h"
 
 #include <exception>
@@ -39,6 +40,27 @@ FittedModel fitChosenModel(const FoundForm& form, PrintProcess process, bool fit
         throw ToolError(Failure::Calculation, std::string(what) + " failed: " + failure.what());
     }
     return fit;
+}
+
+ModelledForm modelForm(const FoundForm& form, const PrintModel& model)
+{
+    const MeasuredForm measured = form.measuredForm();
+    std::vector<Cmyk> coverages;
+    for (int patch = 0; patch < MeasuredForm::kPatches; ++patch)
+        coverages.push_back(MeasuredForm::coverageOf(patch));
+    const std::vector<Spectrum> modelled = predictSpectra(model, coverages);
+    ModelledForm result;
+    std::vector<double> differences;
+    for (size_t i = 0; i < coverages.size(); ++i) {
+        const Spectrum& spectrum = measured.spectrum(static_cast<int>(i));
+        result.patches.push_back({checkedPatch(coverages[i], chartXYZ(spectrumToXYZ(spectrum)),
+                                               chartXYZ(spectrumToXYZ(modelled[i]))),
+                                  spectrum, modelled[i]});
+        differences.push_back(result.patches.back().check.deltaE2000);
+    }
+    result.deltaE2000 = summarise(differences);
+    result.toneValues = toneValueCurves(measured, model);
+    return result;
 }
 
 } // namespace veltmarquist

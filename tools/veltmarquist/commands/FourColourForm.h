@@ -1,5 +1,6 @@
 // What chart and compare share: the test form read with its warnings kept,
-// and the four-colour model that the options choose, fitted to it.
+// the four-colour model that the options choose, fitted to it, and the form
+// as the model reproduces it.
 #ifndef VELTMARQUIST_TOOL_FOURCOLOURFORM_H
 #define VELTMARQUIST_TOOL_FOURCOLOURFORM_H
 
@@ -20,6 +21,10 @@ FoundForm readTestForm(const std::string& path, const ReadOptions& options, File
 // The library's offset or gravure model (with --fit-gravure its factors
 // fitted), or the Yule-Nielsen model. Failures of a fit are ToolErrors.
 FittedModel fitChosenModel(const FoundForm& form, PrintProcess process, bool fitGravure, bool yuleNielsen);
+
+// The 46 patches measured and as the model gives them (X, Y, Z as the 46-step
+// charts hold them), and the inks' tone values.
+ModelledForm modelForm(const FoundForm& form, const PrintModel& model);
 
 } // namespace veltmarquist
 

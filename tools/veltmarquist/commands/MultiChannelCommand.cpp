@@ -11,9 +11,15 @@
 #include "OutputFile.h"
 #include "PatchMatching.h"
 #include "ToolError.h"
+#include "report/HtmlReport.h"
+
+#include "Cgats.h"
 
 #include "MathProfile.h"
 
+#include <charconv>
+#include <fstream>
+#include <iterator>
 #include <memory>
 
 namespace veltmarquist {
@@ -99,12 +105,89 @@ std::string combinationsText(const MeasurementBlock& block, int inks)
     return cgatsText(table);
 }
 
+// ---- What the report shows ------------------------------------------------------------------
+
+// The library's channel of each of the file's channels: six inks put ink B
+// on channel 6 (channel 5 stays unprinted).
+std::vector<size_t> libraryChannels(int inks)
+{
+    return inks == 6 ? std::vector<size_t>{0, 1, 2, 3, 4, 6} : std::vector<size_t>{0, 1, 2, 3, 4, 5, 6};
+}
+
+ColouredSpectrum coloured(const Spectrum& spectrum)
+{
+    const Triple XYZ = spectrumToXYZ(spectrum);
+    return {spectrum, XYZ, labOfXYZ(XYZ)};
+}
+
+ChannelPatch measuredPatch(const MeasurementFile& form, const std::vector<int>& thousandths, int inks, int solid)
+{
+    const std::vector<double> bands = libraryBands({&form.layout, &thousandths});
+    Spectrum spectrum{};
+    std::copy_n(bands.begin(), kSpectrumBands, spectrum.begin());
+    std::vector<double> device(static_cast<size_t>(inks), 0.0);
+    if (solid >= 0)
+        device[static_cast<size_t>(solid)] = 100.0;
+    return {device, coloured(spectrum)};
+}
+
+// The chart the library wrote (channels C, M, Y, K, RGB_R, RGB_G, RGB_B, then
+// 36 bands), read back from its file: the colours the report shows are the
+// chart's own numbers.
+std::vector<ChannelPatch> readSpectralChart(const std::string& path, int inks)
+{
+    std::ifstream in(path, std::ios::binary);
+    const std::string text{std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
+    const auto [table, error] = cgats::readTable(text);
+    if (error)
+        throw ToolError(Failure::Internal, "the library's spectral chart cannot be read back: " + error->message);
+    std::vector<ChannelPatch> patches;
+    for (const std::vector<std::string>& row : table.rows) {
+        std::vector<double> values;
+        for (const std::string& cell : row) {
+            double value = 0.0;
+            std::from_chars(cell.data(), cell.data() + cell.size(), value);
+            values.push_back(value);
+        }
+        if (values.size() < 7 + kSpectrumBands)
+            throw ToolError(Failure::Internal, "the library's spectral chart has a short row");
+        ChannelPatch patch;
+        for (size_t channel : libraryChannels(inks))
+            patch.device.push_back(values[channel]);
+        std::copy_n(values.begin() + 7, kSpectrumBands, patch.colour.spectrum.begin());
+        patch.colour = coloured(patch.colour.spectrum);
+        patches.push_back(std::move(patch));
+    }
+    return patches;
+}
+
+// Paper and solids as measured, the chart, and the tone ramps the library
+// built for it (one list of 101 tones per channel of a fresh profile).
+void collectForReport(MultiChannelResult& result, const PendingOutput& chart, MathProfile& profile)
+{
+    const std::vector<std::vector<int>>& picked = result.picked->thousandths;
+    result.paperAndSolids.push_back(measuredPatch(*result.form, picked[4], result.inks, -1));
+    for (int ink = 0; ink < result.inks; ++ink)
+        result.paperAndSolids.push_back(
+            measuredPatch(*result.form, picked[static_cast<size_t>(ink < 4 ? ink : ink + 4)], result.inks, ink));
+    result.chart = readSpectralChart(chart.temporaryPath(), result.inks);
+    for (size_t channel : libraryChannels(result.inks)) {
+        std::vector<ColouredSpectrum> ramp;
+        for (const MathProfile::ColorPatch& tone : profile.tintLists[channel]) {
+            Spectrum spectrum{};
+            std::copy_n(tone.spectrum, kSpectrumBands, spectrum.begin());
+            ramp.push_back(coloured(spectrum));
+        }
+        result.ramps.push_back(std::move(ramp));
+    }
+}
+
 } // namespace
 
 void runMultiChannel(const MultiChannelOptions& options, MultiChannelResult& result)
 {
     refuseClashingOutputs({options.form, options.separations},
-                          {options.output, options.combinations, options.separatedOutput});
+                          {options.output, options.combinations, options.separatedOutput, options.report});
     result.inks = options.inks;
     result.form = loadMeasurementFile(options.form, options.read);
     const MeasurementFile& form = *result.form;
@@ -130,12 +213,16 @@ void runMultiChannel(const MultiChannelOptions& options, MultiChannelResult& res
         records = orderSeparations(separations, options.separations);
     }
 
-    PendingOutput chart(options.output);
-    std::unique_ptr<PendingOutput> combinations, separated;
+    // The report alone still needs the library's chart for its colours: it
+    // is then written to a temporary file that is never delivered.
+    PendingOutput chart(options.output.empty() ? "/dev/null" : options.output);
+    std::unique_ptr<PendingOutput> combinations, separated, report;
     if (!options.combinations.empty())
         combinations = std::make_unique<PendingOutput>(options.combinations);
     if (!options.separations.empty())
         separated = std::make_unique<PendingOutput>(options.separatedOutput);
+    if (!options.report.empty())
+        report = std::make_unique<PendingOutput>(options.report);
 
     std::vector<MeasuredSpectrum> spectra;
     for (const std::vector<int>& thousandths : picked.thousandths)
@@ -143,6 +230,7 @@ void runMultiChannel(const MultiChannelOptions& options, MultiChannelResult& res
     MeasurementBlock block = buildBlock(spectra, VM_EXCHANGE_BUFFER_INTS);
     Profile profile(fileStem(options.form));
     profile.calculate(options.inks == 6 ? VM_PROCESS_SIX_COLOUR : VM_PROCESS_SEVEN_COLOUR, chart, block);
+    collectForReport(result, chart, profile.object());
     if (combinations)
         combinations->write(combinationsText(block, options.inks));
     if (separated) {
@@ -158,16 +246,12 @@ void runMultiChannel(const MultiChannelOptions& options, MultiChannelResult& res
     }
 
     result.separationsPath = options.separations;
-    chart.commit();
-    result.chartWritten = chart.name();
-    if (combinations) {
-        combinations->commit();
-        result.combinationsWritten = combinations->name();
-    }
-    if (separated) {
-        separated->commit();
-        result.separatedWritten = separated->name();
-    }
+    if (report)
+        report->write(htmlReport(result));
+    deliver(options.output.empty() ? nullptr : &chart, result.chartWritten);
+    deliver(combinations.get(), result.combinationsWritten);
+    deliver(separated.get(), result.separatedWritten);
+    deliver(report.get(), result.reportWritten);
 }
 
 } // namespace veltmarquist

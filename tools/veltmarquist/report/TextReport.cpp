@@ -2,6 +2,7 @@
 #include "TextReport.h"
 
 #include "Messages.h"
+#include "ModelInWords.h"
 
 #include <algorithm>
 #include <cctype>
@@ -47,16 +48,6 @@ void printForm(const FoundForm& form, std::ostream& out)
     if (form.picked.averaged > 0)
         out << " (repeated measurements averaged for " << form.picked.averaged << " of them)";
     out << "; " << form.picked.setsIgnored << " other measurements ignored\n";
-}
-
-// The fitted value whose name starts with `name`; empty numbers when there is none.
-const FittedValue& valueNamed(const PrintModel& model, const std::string& name)
-{
-    static const FittedValue none;
-    const std::vector<FittedValue>& values = model.fittedValues();
-    const auto found = std::find_if(values.begin(), values.end(),
-                                    [&](const FittedValue& value) { return value.name.rfind(name, 0) == 0; });
-    return found == values.end() ? none : *found;
 }
 
 std::string inks(const std::vector<double>& numbers, int decimals)
@@ -154,6 +145,12 @@ void printCheck(const ChartResult& result, std::ostream& out)
     out << "  largest difference at " << describeCmyk(result.check[all.largest].device) << "\n";
 }
 
+void printReportWritten(const std::string& written, std::ostream& out)
+{
+    if (!written.empty())
+        out << "report: HTML report written to " << written << "\n";
+}
+
 // The form and the model, as far as they came; true when the model came.
 bool printFormAndModel(const FormAndModel& result, std::ostream& out)
 {
@@ -170,16 +167,19 @@ bool printFormAndModel(const FormAndModel& result, std::ostream& out)
 void renderChart(const ChartResult& result, std::ostream& out)
 {
     printWarnings(result.layoutWarnings);
-    if (!printFormAndModel(result, out) || result.written.empty())
+    if (!printFormAndModel(result, out) || (result.written.empty() && result.reportWritten.empty()))
         return;
-    out << "chart: " << result.patches << " patches (";
-    if (!result.layout.empty())
-        out << result.layout << ", ";
-    if (!result.format.empty())
-        out << result.format << ", ";
-    out << (result.fit->yuleNielsen ? "Yule-Nielsen" : result.fit->name()) << " model) written to " << result.written
-        << "\n";
+    if (!result.written.empty()) {
+        out << "chart: " << result.patches << " patches (";
+        if (!result.layout.empty())
+            out << result.layout << ", ";
+        if (!result.format.empty())
+            out << result.format << ", ";
+        out << (result.fit->yuleNielsen ? "Yule-Nielsen" : result.fit->name()) << " model) written to "
+            << result.written << "\n";
+    }
     printCheck(result, out);
+    printReportWritten(result.reportWritten, out);
 }
 
 void renderCompare(const CompareResult& result, std::ostream& out)
@@ -189,15 +189,16 @@ void renderCompare(const CompareResult& result, std::ostream& out)
     out << "measured 46-step chart written to " << result.measuredWritten << "\n"
         << "modelled 46-step chart (" << result.fit->name() << ") written to " << result.modelWritten << "\n"
         << "patch  C    M    Y    K     dE*ab   dE00\n";
-    for (size_t i = 0; i < result.patches.size(); ++i) {
-        const CheckedPatch& patch = result.patches[i];
+    for (size_t i = 0; i < result.modelled->patches.size(); ++i) {
+        const CheckedPatch& patch = result.modelled->patches[i].check;
         char line[96];
         std::snprintf(line, sizeof line, "%5zu  %-4g %-4g %-4g %-4g %6.2f %6.2f\n", i + 1, patch.device[0],
                       patch.device[1], patch.device[2], patch.device[3], patch.deltaEab, patch.deltaE2000);
         out << line;
     }
     printSummary("dE*ab    over " + std::to_string(result.deltaEab.count) + " patches:", result.deltaEab, out);
-    printSummary("CIEDE2000 over " + std::to_string(result.deltaE2000.count) + " patches:", result.deltaE2000, out);
+    printSummary("CIEDE2000 over " + std::to_string(result.modelled->deltaE2000.count) + " patches:",
+                 result.modelled->deltaE2000, out);
 }
 
 void renderMultiChannel(const MultiChannelResult& result, std::ostream& out)
@@ -211,16 +212,16 @@ void renderMultiChannel(const MultiChannelResult& result, std::ostream& out)
             << " solids found; " << result.picked->setsIgnored << " other measurements ignored\n";
     }
     printWarnings(result.separationsWarnings);
-    if (result.chartWritten.empty())
-        return;
-    out << (result.inks == 6 ? "six-colour chart: 128" : "seven-colour chart: 159")
-        << " spectral patches written to " << result.chartWritten << "\n";
+    if (!result.chartWritten.empty())
+        out << (result.inks == 6 ? "six-colour chart: 128" : "seven-colour chart: 159")
+            << " spectral patches written to " << result.chartWritten << "\n";
     if (!result.combinationsWritten.empty())
         out << "combinations: 3499 C, M, Y, K combinations for the separation software written to "
             << result.combinationsWritten << "\n";
     if (!result.separatedWritten.empty())
         out << "separated set: 3499 patches (XYZ) predicted from " << result.separationsPath << " written to "
             << result.separatedWritten << "\n";
+    printReportWritten(result.reportWritten, out);
 }
 
 void renderConvert(const ConvertResult& result, std::ostream& out)

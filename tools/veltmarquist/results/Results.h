@@ -3,7 +3,8 @@
 // A command fills its result step by step as it goes: when it fails, the
 // steps it finished stay filled (and are shown before the error, as a run
 // shows them), the others stay empty. Plain values only: no printing here
-// (report/TextReport.h renders them as the terminal text).
+// (report/TextReport.h renders them as the terminal text, report/HtmlReport.h
+// as the HTML page).
 #ifndef VELTMARQUIST_TOOL_RESULTS_H
 #define VELTMARQUIST_TOOL_RESULTS_H
 
@@ -12,10 +13,12 @@
 #include "PatchMatching.h"
 #include "PredictionCheck.h"
 #include "TestForm.h"
+#include "ToneValues.h"
 
 #include "VeltmarquistDLL.h"
 #include "models/PrintModels.h"
 
+#include <array>
 #include <memory>
 #include <optional>
 #include <string>
@@ -40,14 +43,28 @@ struct FittedModel {
     const char* name() const { return yuleNielsen ? "ynsn" : process == VM_PROCESS_GRAVURE ? "gravure" : "offset"; }
 };
 
+// A patch of the test form, measured and as the model gives it.
+struct FormPatch {
+    CheckedPatch check;              // X, Y, Z as the 46-step charts hold them
+    Spectrum measured{}, modelled{}; // the measured one after the form's orientation check
+};
+
+// The form as the fitted model reproduces it.
+struct ModelledForm {
+    std::vector<FormPatch> patches;             // the 46, in measuring order
+    Summary deltaE2000;                         // of the 46 patches
+    std::array<ToneValueCurve, 4> toneValues{}; // C, M, Y, K: measured tints and the model's
+};
+
 // What chart and compare begin with: the form found, the model fitted.
 struct FormAndModel {
     FileWarnings formWarnings;
     std::optional<FoundForm> form;
     std::optional<FittedModel> fit;
+    std::optional<ModelledForm> modelled;
 };
 
-// chart FORM -o CHART
+// chart FORM -o CHART, and report FORM (the same without a chart)
 struct ChartResult : FormAndModel {
     FileWarnings layoutWarnings;      // of a layout read from a file
     std::string layout;               // empty for the library's chart, else how the export names its patches
@@ -62,24 +79,40 @@ struct ChartResult : FormAndModel {
     std::vector<CheckedPatch> check;
     CheckSummary checkSummary;        // of every checked patch
     CheckSummary chartCheckSummary;   // of those on the chart
+    std::string reportWritten;        // how messages name the delivered HTML report; empty until delivered
 };
 
 // compare FORM
 struct CompareResult : FormAndModel {
     std::string measuredWritten, modelWritten; // empty until delivered
-    std::vector<CheckedPatch> patches;         // the 46 patches, X, Y, Z as their charts hold them
-    Summary deltaEab, deltaE2000;
+    Summary deltaEab;                          // of the 46 patches (CIEDE2000: modelled->deltaE2000)
 };
 
-// multichannel FORM --inks 6|7 -o CHART
+// A spectrum and its colour (X, Y, Z as the library sums them, CIELAB).
+struct ColouredSpectrum {
+    Spectrum spectrum{};
+    Triple XYZ{};
+    Lab lab{};
+};
+
+// A patch of a multi-channel spectral chart: the file's channels in percent.
+struct ChannelPatch {
+    std::vector<double> device;
+    ColouredSpectrum colour;
+};
+
+// multichannel FORM --inks 6|7 -o CHART, and report FORM --inks 6|7
 struct MultiChannelResult {
     int inks = 7;
     FileWarnings formWarnings;
     std::optional<MeasurementFile> form;
     std::optional<PickedPatches> picked;
+    std::vector<ChannelPatch> paperAndSolids; // the paper, then each ink's solid in the file's channel order
+    std::vector<ChannelPatch> chart;          // the spectral chart as the library wrote it
+    std::vector<std::vector<ColouredSpectrum>> ramps; // each ink's tone ramp, 0..100 % in 1 % steps
     FileWarnings separationsWarnings;
     std::string separationsPath;
-    std::string chartWritten, combinationsWritten, separatedWritten; // empty until delivered
+    std::string chartWritten, combinationsWritten, separatedWritten, reportWritten; // empty until delivered
 };
 
 // convert CHART
