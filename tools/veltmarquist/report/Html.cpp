@@ -85,7 +85,7 @@ svg text.small { font-size: 10px; fill: var(--muted); }
 table.heat td { text-align: center; min-width: 3.6em; border: 1px solid #ffffff; padding: 4px 2px; }
 table.heat td .n { display: block; font-size: 10px; opacity: 0.8; }
 table.heat th { text-align: center; font-size: 12px; white-space: nowrap; padding: 3px 4px; }
-.heatmaps { display: grid; grid-template-columns: repeat(auto-fill, minmax(560px, 1fr)); gap: 6px 18px; }
+.heatmaps { display: flex; flex-wrap: wrap; gap: 6px 18px; align-items: flex-start; }
 * { -webkit-print-color-adjust: exact; print-color-adjust: exact; }
 @page { size: A4; margin: 12mm; }
 @media print {
@@ -108,7 +108,7 @@ table.heat th { text-align: center; font-size: 12px; white-space: nowrap; paddin
   .swatches { gap: 6px; }
   .swatches .group { flex-basis: 6.5em; }
   .plots.wide { grid-template-columns: 1fr; }
-  .heatmaps { grid-template-columns: 1fr; }
+  .heatmaps { display: block; }
 }
 )";
 
