@@ -2,7 +2,8 @@
 #include "Bindings.h"
 
 #include "Arrays.h"
-#include "OutputFiles.h"
+#include "LibraryHost.h"
+#include "OutputFile.h"
 
 #include "ColourDifference.h"
 #include "Files.h"
@@ -117,8 +118,8 @@ py::object convertChart(const py::object& spectraGiven, const py::object& channe
     block.count = static_cast<int>(spectra.count() + 2);
     {
         py::gil_scoped_release released;
-        AtomicFile output(path.string());
-        LibraryProfile profile(fileStem(path.string()));
+        PendingOutput output(path.string());
+        Profile profile(fileStem(path.string()));
         profile.calculate(mode->second, output, block);
         output.commit();
     }

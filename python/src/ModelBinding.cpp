@@ -2,7 +2,8 @@
 #include "Bindings.h"
 
 #include "Arrays.h"
-#include "OutputFiles.h"
+#include "LibraryHost.h"
+#include "OutputFile.h"
 
 #include "ChartExport.h"
 #include "commands/FourColourForm.h"
@@ -120,7 +121,7 @@ std::size_t writeChart(const Model& model, const std::filesystem::path& path, co
     py::gil_scoped_release released;
     exporting::checkOptions(options);
     const exporting::PatchLayout layout = exporting::readLayout(layoutName);
-    AtomicFile output(path.string());
+    PendingOutput output(path.string());
     try {
         output.write(exporting::exportChart(*model.fit.model, exporting::provenanceOf(model.found->file,
                                                                                         model.found->path),

@@ -2,7 +2,8 @@
 #include "Bindings.h"
 
 #include "Arrays.h"
-#include "OutputFiles.h"
+#include "LibraryHost.h"
+#include "OutputFile.h"
 
 #include "Files.h"
 #include "LibraryBlock.h"
@@ -27,7 +28,7 @@ namespace {
 // process 3 or 5 left in it.
 struct MultiChannelChart {
     int inks = 7;
-    std::unique_ptr<LibraryProfile> profile;
+    std::unique_ptr<Profile> profile;
     MeasurementBlock block;
     py::object combinations;
     std::mutex busy; // a profile runs one calculation at a time
@@ -56,8 +57,8 @@ std::shared_ptr<MultiChannelChart> writeMultiChannelChart(const py::object& give
         for (const std::vector<int>& thousandths : picked.thousandths)
             spectra.push_back({&file.layout, &thousandths});
         chart->block = buildBlock(spectra, VM_EXCHANGE_BUFFER_INTS);
-        chart->profile = std::make_unique<LibraryProfile>(fileStem(form->path));
-        AtomicFile output(path.string());
+        chart->profile = std::make_unique<Profile>(fileStem(form->path));
+        PendingOutput output(path.string());
         chart->profile->calculate(inks == 6 ? VM_PROCESS_SIX_COLOUR : VM_PROCESS_SEVEN_COLOUR, output, chart->block);
         output.commit();
     }
@@ -102,7 +103,7 @@ void writeSeparatedChart(MultiChannelChart& chart, const py::object& separations
     py::gil_scoped_release released;
     const std::lock_guard<std::mutex> lock(chart.busy);
     std::copy(exchange.begin(), exchange.end(), chart.block.ints.begin());
-    AtomicFile output(path.string());
+    PendingOutput output(path.string());
     chart.profile->calculate(VM_PROCESS_SEPARATED_SET, output, chart.block);
     output.commit();
 }

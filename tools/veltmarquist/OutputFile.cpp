@@ -25,11 +25,16 @@ namespace {
 
 // ---- Interruption ---------------------------------------------------------------------------
 //
-// SIGINT, SIGTERM and SIGHUP remove every temporary file of the run and then
-// end the process with the signal's default action, so that the caller sees
-// the usual status. The handler may only call async-signal-safe functions:
-// it reads the names from fixed buffers that are changed with those signals
-// blocked, unlinks them and re-raises.
+// In a program that asks for it (the tool), SIGINT, SIGTERM and SIGHUP remove
+// every temporary file of the run and then end the process with the signal's
+// default action, so that the caller sees the usual status. The handler may
+// only call async-signal-safe functions: it reads the names from fixed
+// buffers that are changed with those signals blocked, unlinks them and
+// re-raises. A host with its own handling of signals and threads (the Python
+// module) leaves this off: its temporary files are removed when their
+// outputs go out of scope.
+
+bool gCleanUpOnSignals = false;
 
 constexpr int kSlots = 8; // a run has at most three outputs at once
 char gTemporaryNames[kSlots][PATH_MAX];
@@ -97,11 +102,19 @@ private:
 // Returns the descriptor and sets `path` and `slot`.
 int createRegisteredTemporary(const std::string& pattern, std::string& path, int& slot)
 {
-    installHandlers();
     if (pattern.size() >= PATH_MAX) {
         errno = ENAMETOOLONG;
         return -1;
     }
+    if (!gCleanUpOnSignals) {
+        std::string name = pattern;
+        const int descriptor = ::mkstemp(&name[0]);
+        if (descriptor >= 0)
+            path = name;
+        slot = -1;
+        return descriptor;
+    }
+    installHandlers();
     InterruptionsHeld held;
     slot = 0;
     while (slot < kSlots && gSlotUsed[slot] != 0)
@@ -264,6 +277,11 @@ std::string describePatch(const std::vector<std::string>& fields, const std::vec
 }
 
 } // namespace
+
+void cleanUpTemporariesOnSignals()
+{
+    gCleanUpOnSignals = true;
+}
 
 bool isStandardOutput(const std::string& path)
 {
@@ -435,7 +453,7 @@ void PendingOutput::deliverByCopy()
         ::close(source);
     if (target >= 0 && target != STDOUT_FILENO && ::close(target) != 0 && failure == 0)
         failure = errno;
-    if (failure == EPIPE) {
+    if (failure == EPIPE && gCleanUpOnSignals) {
         // The reader has gone, as with `| head`: end quietly, as a filter
         // does, with the status of SIGPIPE.
         ::unlink(temporary_.c_str());

@@ -9,6 +9,13 @@
 
 namespace veltmarquist {
 
+// For a program of its own (the tool, not a host such as the Python module):
+// from now on SIGINT, SIGTERM and SIGHUP remove the temporary files of every
+// pending output before the process ends with the signal's status, and a
+// reader of standard output or a FIFO that goes away ends the process
+// quietly with the status of SIGPIPE, as a filter does. Call it once, first.
+void cleanUpTemporariesOnSignals();
+
 // "-" names standard output.
 bool isStandardOutput(const std::string& path);
 
@@ -31,7 +38,8 @@ void refuseClashingOutputs(const std::vector<std::string>& inputs, const std::ve
 // - standard output ("-"), a FIFO or a device: the temporary file lies in
 //   $TMPDIR (or /tmp) and is copied into the target, which is never replaced.
 // Without commit, or when the process is interrupted (SIGINT, SIGTERM,
-// SIGHUP), the temporary file is removed and the target stays untouched.
+// SIGHUP, with cleanUpTemporariesOnSignals), the temporary file is removed
+// and the target stays untouched.
 class PendingOutput {
 public:
     explicit PendingOutput(std::string path); // OutputUnwritable when the target cannot take it

@@ -261,6 +261,7 @@ int main(int argc, char** argv)
     // A closed pipe shows as EPIPE where the tool writes: the report stops
     // quietly, a chart on standard output ends the run quietly.
     std::signal(SIGPIPE, SIG_IGN);
+    cleanUpTemporariesOnSignals();
     try {
         app.parse(argc, argv);
     } catch (const CLI::Success& done) {
