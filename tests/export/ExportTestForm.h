@@ -6,6 +6,9 @@
 #include "ChartLayouts.h"
 #include "models/PrintModels.h"
 
+#include <unistd.h>
+
+#include <filesystem>
 #include <fstream>
 #include <functional>
 
@@ -48,7 +51,14 @@ inline const PrintModel& anyCoverageModel()
 
 inline std::string temporaryFile(const std::string& name, const std::string& text)
 {
-    const std::string path = "/tmp/veltmarquist-export-test-" + name;
+    // One folder per process, so that runs at once do not share files; removed at the end.
+    static const struct Folder {
+        std::filesystem::path path = std::filesystem::temp_directory_path() /
+                                     ("veltmarquist-export-test-" + std::to_string(::getpid()));
+        Folder() { std::filesystem::create_directories(path); }
+        ~Folder() { std::filesystem::remove_all(path); }
+    } folder;
+    const std::string path = (folder.path / name).string();
     std::ofstream(path, std::ios::binary) << text;
     return path;
 }
