@@ -7,12 +7,19 @@ cd "$(dirname "$0")/.."
 
 stages=(20-install-examples 30-fuzz 40-tsan 50-valgrind 60-profile 70-report 80-python)
 
-scripts/setup.sh
-cmake --workflow --preset dev
+# Each step says how long it took, so that the run's time stays in view.
+step() {
+  local started=$SECONDS
+  "$@"
+  echo "-- $* took $((SECONDS - started)) s"
+}
+
+step scripts/setup.sh
+step cmake --workflow --preset dev
 scripts/skipped-tests.sh build/dev
-cmake --workflow --preset asan-ubsan
+step cmake --workflow --preset asan-ubsan
 for stage in "${stages[@]}"; do
   echo "== $stage"
-  bash "scripts/stages/$stage.sh"
+  step bash "scripts/stages/$stage.sh"
 done
-echo "all test stages passed"
+echo "all test stages passed in $SECONDS s"

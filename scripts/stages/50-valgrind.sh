@@ -42,6 +42,8 @@ chart-gravure-fitted 0 $tool chart samples/offset_form.txt --fit-gravure -o $wor
 compare 0 $tool compare samples/offset_form.txt -o $work/compare
 chart-16-band 0 $tool chart samples/offset_form_16band.txt -o $work/offset16.txt
 chart-press-sheet 0 $tool chart samples/offset_press_sheet.txt -o $work/sheet.txt
+chart-ynsn-grid-report 0 $tool chart samples/offset_press_sheet.txt --model ynsn --format cti3 --layout grid:6 --spectral -o $work/grid.ti3 --report $work/sheet.html
+report-seven-ink 0 $tool report samples/seven_ink_form.txt --inks 7 -o $work/seven.html
 six-ink 0 $tool multichannel samples/six_ink_form.txt --inks 6 -o $work/p3.txt --combinations $work/comb6.txt --separations $work/sep6.txt --separated-out $work/p3-p6.txt
 seven-ink 0 $tool multichannel samples/seven_ink_form.txt --inks 7 -o $work/p5.txt --combinations $work/comb7.txt --separations $work/sep7.txt --separated-out $work/p5-p6.txt
 convert-blend 0 $tool convert samples/chart_two_whites.txt --from PAPER_PRINTED --to PAPER_TARGET --mode blend -o $work/blend.txt
