@@ -182,7 +182,7 @@ TEST(HtmlReport, ShowsWhatTheFileSaysEscaped)
 {
     ts::TempDir dir;
     std::string form = ts::readFile(kSamples + "/offset_form.txt");
-    const std::string instrument = "<i>Spectro</i> & 'Co' \x1b[31m";
+    const std::string instrument = "<i>Spectro</i> &\t'Co' \x1b[31m";
     form.insert(form.find('\n') + 1, "INSTRUMENTATION\t\"" + instrument + "\"\n");
     std::ofstream(dir.path("form <&>.txt")) << form;
     const auto [html, text] = report({"", dir.path("form <&>.txt"), 0, false, false, {}}, dir);

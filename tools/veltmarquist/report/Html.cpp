@@ -131,7 +131,11 @@ std::string clipMark(const DisplayColour& colour, int x, int y)
 
 std::string text(const std::string& raw)
 {
-    const std::string shown = escapeControls(raw);
+    // A TAB inside a quoted header value (spreadsheet exports leave them in
+    // "ILLUMINANT,<TAB>D50") is a space on a page; other controls stay visible.
+    std::string spaced = raw;
+    std::replace(spaced.begin(), spaced.end(), '\t', ' ');
+    const std::string shown = escapeControls(spaced);
     std::string out;
     out.reserve(shown.size());
     for (const char character : shown) {

@@ -14,9 +14,9 @@
 
 namespace veltmarquist::html {
 
-// Text for element content and attribute values: control characters and
-// bytes that are not UTF-8 escaped as every message shows them, then
-// & < > " ' as character references.
+// Text for element content and attribute values: a TAB as a space, other
+// control characters and bytes that are not UTF-8 escaped as every message
+// shows them, then & < > " ' as character references.
 std::string text(const std::string& raw);
 
 // `value` with `decimals` digits after the point, the same in every locale;
