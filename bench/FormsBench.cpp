@@ -34,13 +34,10 @@ void FindTestForm(benchmark::State& state)
 void FitAndCheckYuleNielsen(benchmark::State& state)
 {
     const FoundForm form = findTestForm(measurementPath(), ReadOptions{});
-    std::vector<Cmyk> coverages = characterisationChart();
-    const std::vector<Cmyk> measured = measuredCombinations(form.file);
-    coverages.insert(coverages.end(), measured.begin(), measured.end());
     size_t checked = 0;
     for (auto _ : state) {
         const auto model = fitYuleNielsenModel(form.measuredForm());
-        checked = checkPredictions(form.file, coverages, *model).size();
+        checked = checkModel(form.file, *model).patches.size();
     }
     state.SetLabel(std::to_string(checked) + " combinations checked");
 }

@@ -1,8 +1,6 @@
 // numpy arrays in and out, and file text as str.
 #include "Arrays.h"
 
-#include "DecimalValues.h"
-
 #include <cmath>
 #include <utility>
 
@@ -57,12 +55,6 @@ py::str text(const std::string& bytes)
     if (decoded == nullptr)
         throw py::error_already_set();
     return py::reinterpret_steal<py::str>(decoded);
-}
-
-std::int64_t roundedUnits(double value, std::int64_t per)
-{
-    const auto millionths = static_cast<std::int64_t>(std::llround(value * 1e6));
-    return divideRounded(millionths, 1000000 / per);
 }
 
 } // namespace veltmarquist::python

@@ -6,7 +6,6 @@
 #include <pybind11/pybind11.h>
 
 #include <cstddef>
-#include <cstdint>
 #include <string>
 #include <vector>
 
@@ -44,11 +43,6 @@ py::array_t<double> vector(std::vector<double> values);
 // Text from a file or the library as str: bytes that are not UTF-8 are kept
 // as \xHH escapes instead of failing.
 py::str text(const std::string& bytes);
-
-// A value given in percent or reflectance, to the nearest millionth as the
-// reader keeps file values, then to 1/`per` of the unit half away from zero
-// (the library's thousandths, or whole percent), as the tool rounds file values.
-std::int64_t roundedUnits(double value, std::int64_t per);
 
 } // namespace veltmarquist::python
 

@@ -1,11 +1,11 @@
-// The parts of the extension module: each binds one component of the tool
-// to Python, and the objects they hand each other.
+// The parts of the extension module: each binds one component of the host
+// tier to Python, and the objects they hand each other.
 #ifndef VELTMARQUIST_PYTHON_BINDINGS_H
 #define VELTMARQUIST_PYTHON_BINDINGS_H
 
+#include "FourColourForm.h"
 #include "MeasurementFile.h"
 #include "TestForm.h"
-#include "results/Results.h"
 
 #include <pybind11/pybind11.h>
 

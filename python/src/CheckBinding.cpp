@@ -6,61 +6,25 @@
 #include "PatchMatching.h"
 #include "PredictionCheck.h"
 
-#include <pybind11/stl.h>
+#include "Numbers.h"
 
-#include <cstdio>
+#include <pybind11/stl.h>
 
 namespace veltmarquist::python {
 
 namespace {
 
-struct CheckResult {
-    std::vector<CheckedPatch> patches;
-    CheckSummary all, chart;
-    bool everyCoverage = false; // the model was checked beyond the chart's combinations
-};
+using CheckResult = ModelCheck;
 
 const char* const kBlackRanges[] = {"K 0", "K 1-40", "K 41-85", "K 86-100"};
 
-std::string fixed(double value)
-{
-    char text[64];
-    std::snprintf(text, sizeof text, "%.2f", value);
-    return text;
-}
-
-std::string summaryLine(const std::string& what, const Summary& summary)
-{
-    return what + " mean " + fixed(summary.mean) + ", 95th percentile " + fixed(summary.p95) + ", max " +
-           fixed(summary.max) + "\n";
-}
-
-// The lines the tool's chart command prints about its check.
+// The lines the tool prints about its check.
 std::string report(const CheckResult& result)
 {
-    if (result.patches.empty())
-        return "check: no combinations measured beyond the test form\n";
-    const std::string count = std::to_string(result.all.deltaE2000.count);
-    if (!result.everyCoverage)
-        return summaryLine("check: " + count + " chart combinations measured beyond the test form, CIEDE2000",
-                           result.all.deltaE2000) +
-               "  largest difference at " + describeDevice({result.patches[result.all.largest].device.begin(),
-                                                            result.patches[result.all.largest].device.end()}) +
-               "\n";
-    std::string text = summaryLine("check: " + count + " combinations measured beyond the test form, CIEDE2000",
-                                   result.all.deltaE2000);
-    if (result.chart.deltaE2000.count > 0)
-        text += summaryLine("  " + std::to_string(result.chart.deltaE2000.count) + " of them on the chart:",
-                            result.chart.deltaE2000);
-    std::string means;
-    for (std::size_t range = 0; range < 4; ++range)
-        if (result.all.byBlack[range].count > 0)
-            means += (means.empty() ? "" : ", ") + std::string(kBlackRanges[range]) + " " +
-                     fixed(result.all.byBlack[range].mean) + " (" + std::to_string(result.all.byBlack[range].count) +
-                     ")";
-    const Cmyk& largest = result.patches[result.all.largest].device;
-    return text + "  means by black (combinations): " + means + "\n  largest difference at " +
-           describeDevice({largest.begin(), largest.end()}) + "\n";
+    std::string text;
+    for (const std::string& line : checkLines(result))
+        text += line + "\n";
+    return text;
 }
 
 // One column set of the patches as an N x `columns` array.
@@ -99,21 +63,9 @@ py::object checkModel(const Model& model, const py::object& measurements)
         other = measurementsOf(measurements, std::nullopt);
     const MeasurementFile& file = other ? other->file : model.found->file;
     CheckResult result;
-    result.everyCoverage = model.fit.model->levels().empty();
     {
         py::gil_scoped_release released;
-        std::vector<Cmyk> coverages = characterisationChart();
-        if (result.everyCoverage) {
-            const std::vector<Cmyk> measured = measuredCombinations(file);
-            coverages.insert(coverages.end(), measured.begin(), measured.end());
-        }
-        result.patches = checkPredictions(file, coverages, *model.fit.model);
-        std::vector<CheckedPatch> onChart;
-        for (const CheckedPatch& patch : result.patches)
-            if (patch.onChart)
-                onChart.push_back(patch);
-        result.all = summariseChecks(result.patches);
-        result.chart = summariseChecks(onChart);
+        result = veltmarquist::checkModel(file, *model.fit.model);
     }
     return py::cast(std::move(result));
 }
@@ -126,14 +78,15 @@ void bindCheck(py::module_& module)
         .def_readonly("p95", &Summary::p95)
         .def_readonly("max", &Summary::max)
         .def("__repr__", [](const Summary& s) {
-            return "Summary(count=" + std::to_string(s.count) + ", mean=" + fixed(s.mean) + ", p95=" + fixed(s.p95) +
-                   ", max=" + fixed(s.max) + ")";
+            return "Summary(count=" + std::to_string(s.count) + ", mean=" + fixedText(s.mean, 2) +
+                   ", p95=" + fixedText(s.p95, 2) + ", max=" + fixedText(s.max, 2) + ")";
         });
 
     py::class_<CheckResult>(module, "CheckResult", R"(
 A model's predictions against the averaged measurements of the combinations
-a file measured beyond the test form, one row per combination: the chart's
-combinations in chart order, then (Yule-Nielsen) the others in file order.
+a file measured beyond the test form that the model predicts, one row per
+combination: the chart's combinations in chart order, then the others in file
+order. left_out counts the measured combinations the check could not take.
 XYZ as the library's chart holds the prediction (Y limited, cut to two
 decimals) and the measurement (Y limited); CIELAB, dE*ab and CIEDE2000 from
 LittleCMS, as the tool computes them.)")
@@ -178,6 +131,17 @@ LittleCMS, as the tool computes them.)")
                 return r.patches.empty() ? py::object(py::none()) : py::int_(r.all.largest);
             },
             "The row of the (first) largest CIEDE2000, or None.")
+        .def_property_readonly(
+            "left_out",
+            [](const CheckResult& r) {
+                py::dict why;
+                why["off_levels"] = r.leftOut.offLevels;
+                why["further_inks"] = r.leftOut.furtherInks;
+                why["form_patches"] = r.leftOut.formPatches;
+                return why;
+            },
+            "Measured combinations left out, by why: 'off_levels' (a coverage the model does not predict), "
+            "'further_inks' (ink beyond C, M, Y, K), 'form_patches' (the test form's own, fitted).")
         .def("__len__", [](const CheckResult& r) { return r.patches.size(); })
         .def("__str__", [](const CheckResult& r) {
             const std::string lines = report(r);

@@ -2,12 +2,11 @@
 #include "Bindings.h"
 
 #include "Arrays.h"
-#include "LibraryHost.h"
-#include "OutputFile.h"
 
 #include "ChartExport.h"
-#include "commands/FourColourForm.h"
-#include "ToolError.h"
+#include "Failure.h"
+#include "FourColourForm.h"
+#include "OutputFile.h"
 
 #include <pybind11/stl.h>
 #include <pybind11/stl/filesystem.h>
@@ -51,22 +50,30 @@ py::object valueOf(const FittedValue& value)
     return vector(value.numbers);
 }
 
+// The one choice model= and the older fit_gravure= make.
+ModelChoice chosenModel(const std::optional<std::string>& name, bool fitGravure)
+{
+    const std::optional<ModelChoice> choice = name ? modelChoiceNamed(*name) : ModelChoice::offset;
+    if (!choice)
+        throw HostError(Failure::Usage, "unknown model '" + *name + "'; models: " + modelChoiceNames());
+    if (!fitGravure)
+        return *choice;
+    if (name && *choice != ModelChoice::gravure && *choice != ModelChoice::gravureFitted)
+        throw HostError(Failure::Usage, "fit_gravure fits the gravure model; it cannot go with model='" + *name + "'");
+    return ModelChoice::gravureFitted;
+}
+
 Model fitModel(const py::object& given, const std::optional<std::string>& name, bool fitGravure,
                std::optional<double> scale)
 {
-    const std::string chosen = name.value_or(fitGravure ? "gravure" : "offset");
-    if (chosen != "offset" && chosen != "gravure" && chosen != "ynsn")
-        throw ToolError(Failure::Usage, "unknown model '" + chosen + "'; models: offset, gravure, ynsn");
-    if (fitGravure && chosen != "gravure")
-        throw ToolError(Failure::Usage, "fit_gravure fits the gravure model; it cannot go with model='" + chosen + "'");
+    const ModelChoice choice = chosenModel(name, fitGravure);
     Model model;
     const std::shared_ptr<Measurements> measurements = measurementsOf(given, scale);
     model.form = py::cast(measurements);
     {
         py::gil_scoped_release released;
         auto found = std::make_shared<FoundForm>(findTestForm(measurements->file, measurements->path));
-        model.fit = fitChosenModel(*found, chosen == "gravure" ? VM_PROCESS_GRAVURE : VM_PROCESS_OFFSET, fitGravure,
-                                   chosen == "ynsn");
+        model.fit = veltmarquist::fitModel(*found, choice);
         model.found = std::move(found);
     }
     py::list warnings;
@@ -105,35 +112,22 @@ std::size_t writeChart(const Model& model, const std::filesystem::path& path, co
                        const std::string& format, bool spectral, std::optional<double> inkLimit,
                        const std::optional<std::string>& created)
 {
-    using exporting::ExportError;
     const std::string layoutName = py::isinstance<py::str>(layoutGiven)
                                        ? layoutGiven.cast<std::string>()
                                        : layoutGiven.cast<std::filesystem::path>().string();
     exporting::ExportOptions options;
-    const auto named = exporting::chartFormatNamed(format);
-    if (!named)
-        throw ExportError(ExportError::Kind::Usage,
-                          "unknown chart format '" + format + "'; formats: library, cti3, cgats");
-    options.format = *named;
+    options.format = exporting::chartFormatNamed(format);
     options.spectral = spectral;
     options.inkLimit = inkLimit;
     options.created = created.value_or("");
     py::gil_scoped_release released;
     exporting::checkOptions(options);
     const exporting::PatchLayout layout = exporting::readLayout(layoutName);
+    refuseClashingOutputs({model.found->path, exporting::isGeneratedLayout(layoutName) ? "" : layoutName},
+                          {path.string()});
     PendingOutput output(path.string());
-    try {
-        output.write(exporting::exportChart(*model.fit.model, exporting::provenanceOf(model.found->file,
-                                                                                        model.found->path),
-                                            layout, options));
-    } catch (const ExportError& error) {
-        // As the tool: a generated layout off the model's levels is a bad
-        // argument, a file's patch off them bad content.
-        if (error.kind() != ExportError::Kind::NotPredicted)
-            throw;
-        throw ToolError(exporting::isGeneratedLayout(layoutName) ? Failure::Usage : Failure::InputContent,
-                        error.what());
-    }
+    output.write(exporting::exportChart(*model.fit.model, exporting::provenanceOf(model.found->file, model.found->path),
+                                        layout, options));
     output.commit();
     return layout.size();
 }
@@ -152,7 +146,8 @@ ink_order, trapping_factors; yule_nielsen_n, ink_spreading, dot_area_c ...,
 tint_residual_rms, grey_delta_e_ab, warnings) and an entry of fitted_values
 under the library's name. Make one with fit().)")
         .def_property_readonly(
-            "name", [](const Model& m) { return std::string(m.fit.name()); }, "'offset', 'gravure' or 'ynsn'.")
+            "name", [](const Model& m) { return std::string(nameOf(m.fit.choice)); },
+            "The model chosen: 'offset', 'gravure', 'gravure-fitted' or 'ynsn'.")
         .def_readonly("form", &Model::form, "The Measurements the model was fitted to.")
         .def_readonly("fitted_values", &Model::values, "The fitted values under the library's names.")
         .def_property_readonly(
@@ -202,7 +197,7 @@ tool's summary.)")
                  return names;
              })
         .def("__repr__", [](const Model& m) {
-            return text("<veltmarquist.Model " + std::string(m.fit.name()) + " fitted to " + m.found->path + ">");
+            return text("<veltmarquist.Model " + std::string(nameOf(m.fit.choice)) + " fitted to " + m.found->path + ">");
         });
 
     module.def("fit", &fitModel, py::arg("form"), py::arg("model") = py::none(), py::arg("fit_gravure") = false,
@@ -212,9 +207,10 @@ Fits a print model to the test form in a measurement file.
 form: Measurements or the path of a file; the 46 test-form patches are found
 by their C, M, Y, K values in any order, repeats averaged. model: 'offset'
 (the default: the library's offset model, fitted to the two greys),
-'gravure' or 'ynsn' (Yule-Nielsen, predicts every coverage). fit_gravure fits
-the gravure ink order and trapping factors to red, green and blue (implies
-model='gravure'). scale: the reflectance scale when form is a path.
+'gravure' (default ink order and trapping factors), 'gravure-fitted' (both
+fitted to red, green and blue) or 'ynsn' (Yule-Nielsen, predicts every
+coverage), as the tool's --model. fit_gravure=True is the older spelling of
+model='gravure-fitted'. scale: the reflectance scale when form is a path.
 
 Raises the tool's errors: MissingPatchError naming every missing patch,
 FileFormatError, ContentError, CalculationError, UsageError.)");

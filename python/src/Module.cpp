@@ -1,12 +1,11 @@
-// The extension module veltmarquist._veltmarquist: the bindings, the tool's
+// The extension module veltmarquist._veltmarquist: the bindings, the host's
 // failures as the package's exceptions, and the library's colorimetry on
 // arrays.
 #include "Arrays.h"
 #include "Bindings.h"
 
-#include "ChartLayouts.h"
 #include "ColourDifference.h"
-#include "ToolError.h"
+#include "Failure.h"
 
 #include "models/PrintModels.h"
 
@@ -15,21 +14,6 @@
 namespace veltmarquist::python {
 
 namespace {
-
-// The tool's exit code of each kind of export failure.
-Failure failureOf(exporting::ExportError::Kind kind)
-{
-    using Kind = exporting::ExportError::Kind;
-    switch (kind) {
-    case Kind::Unreadable: return Failure::InputUnreadable;
-    case Kind::Syntax: return Failure::InputSyntax;
-    case Kind::Content:
-    case Kind::NotPredicted: return Failure::InputContent;
-    case Kind::Calculation: return Failure::Calculation;
-    case Kind::Usage: break;
-    }
-    return Failure::Usage;
-}
 
 void raise(Failure failure, const std::string& message)
 {
@@ -43,10 +27,8 @@ void translate(std::exception_ptr failure)
 {
     try {
         std::rethrow_exception(failure);
-    } catch (const ToolError& error) {
+    } catch (const HostError& error) {
         raise(error.failure(), error.what());
-    } catch (const exporting::ExportError& error) {
-        raise(failureOf(error.kind()), error.what());
     }
 }
 

@@ -118,7 +118,7 @@ ERRORS = {
     "six inks from a four-colour form": (lambda m: veltmarquist.multichannel_chart(SHEET, 6, "x"),
                                          veltmarquist.ContentError, "6 inks need the device fields 6CLR_1"),
     "five inks": (lambda m: veltmarquist.multichannel_chart(SHEET, 5, "x"), veltmarquist.UsageError,
-                  "inks must be 6 or 7"),
+                  "a multi-channel form has 6 or 7 inks, not 5"),
     "a spreadsheet": (lambda m: veltmarquist.read_measurements(write("a.csv", "C;M;Y;K\n1;2;3;4\n")),
                       veltmarquist.FileFormatError, "save it as CGATS text"),
     "one id, two patches": (lambda m: veltmarquist.read_measurements(write("d.txt", DUPLICATE)),
@@ -126,11 +126,11 @@ ERRORS = {
     "ink in channel 5": (lambda m: convert(np.full((1, 5), 10.0), "convert"), veltmarquist.ContentError,
                          "give cmyk_only=True"),
     "a white without reflectance": (lambda m: convert(np.zeros((1, 4)), "convert", from_white=np.zeros(36)),
-                                    veltmarquist.ContentError, "the from white has no reflectance at 380 nm"),
+                                    veltmarquist.ContentError, "the white from_white has no reflectance at 380 nm"),
     "percent for reflectance": (lambda m: convert(np.zeros((1, 4)), "copy", spectra=np.full((1, 36), 80.0)),
                                 ValueError, "reflectance factors lie from 0 to 1"),
     "a blend without whites": (lambda m: convert(np.zeros((1, 4)), "blend", from_white=None),
-                               veltmarquist.UsageError, "mode 'blend' needs both whites"),
+                               veltmarquist.UsageError, "a blend needs both whites"),
     "a folder for a chart": (lambda m: m.chart("."), veltmarquist.OutputError, ".: is a folder"),
     "a chart in a missing folder": (lambda m: m.chart("no/chart.txt"), veltmarquist.OutputError,
                                     "no/chart.txt: cannot create a file in no/"),
@@ -170,7 +170,7 @@ def test_failures_raise_the_tools_messages_and_write_nothing(offset, tmp_path, m
 
 @pytest.mark.parametrize("separations, message", [
     (np.zeros((3498, 7)), "3498 separations for 3499 combinations"),
-    (np.full((3499, 7), 100.5), "the separation of combination 1 (C 0 M 0 Y 0 K 0) has channel 1 = 100.5"),
+    (np.full((3499, 7), 100.5), "the separation of combination 1 (C 0 M 0 Y 0 K 0), channel 1 is 100.5"),
     (np.zeros((3499, 6)), "separations must hold 7 values per row"),
 ], ids=["too few", "above 100 %", "six columns for seven inks"])
 def test_bad_separations_are_refused(tmp_path, separations, message):
@@ -199,6 +199,10 @@ def test_outputs_follow_links_and_write_into_devices(offset, tmp_path):
     (tmp_path / "charts").mkdir()
     link = tmp_path / "latest.txt"
     link.symlink_to("charts/chart.txt")
+    # A link that names no file is refused: written through, it would make a file nobody asked for.
+    with pytest.raises(veltmarquist.OutputError, match="is a symbolic link to .*, which does not exist"):
+        offset.chart(link)
+    (tmp_path / "charts" / "chart.txt").write_text("old")
     offset.chart(link)
     assert link.is_symlink()
     assert (tmp_path / "charts" / "chart.txt").read_text().endswith("END_DATA\n")

@@ -1,17 +1,23 @@
 // Every command end to end against the library's charts, and each kind of
 // failure with its exit code, through the built executable.
-#include "../forms/GoldenForms.h"
+#include "GoldenForms.h"
 #include "MeasurementFile.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <sys/stat.h>
 #include <sys/wait.h>
+#include <unistd.h>
 
 #include <algorithm>
+#include <chrono>
+#include <csignal>
+#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
+#include <thread>
 #include <tuple>
 
 using namespace veltmarquist;
@@ -98,6 +104,25 @@ std::string conversionChart(int first, int last)
     }));
 }
 
+long entries(const std::string& dir) { return files(dir); }
+namespace fs = std::filesystem;
+
+// Starts the built tool on the sample form with TMPDIR=`tmp`, default signal actions, stdout to `out`.
+pid_t startTool(const std::string& output, const std::string& tmp, const std::string& out)
+{
+    const pid_t pid = fork();
+    if (pid == 0) {
+        for (const int signal : {SIGINT, SIGTERM, SIGHUP})
+            std::signal(signal, SIG_DFL);
+        setenv("TMPDIR", tmp.c_str(), 1);
+        if (std::freopen(out.c_str(), "w", stdout) != nullptr && std::freopen("/dev/null", "w", stderr) != nullptr)
+            execl(VELTMARQUIST_TOOL, VELTMARQUIST_TOOL, "chart", VELTMARQUIST_SAMPLES_DIR "/offset_form.txt", "-o",
+                  output.c_str(), static_cast<char*>(nullptr));
+        _exit(127);
+    }
+    return pid;
+}
+
 } // namespace
 
 TEST(CommandLine, EveryCommandEqualsTheLibrarysCharts)
@@ -110,7 +135,7 @@ TEST(CommandLine, EveryCommandEqualsTheLibrarysCharts)
         {{"chart", "form.txt", "-o", "c.txt", "--process", "gravure"}, "offset-form.p1.chart", "(defaults; --fit-gravure"},
         // Percent reflectance; the chart combinations measured beyond the test form check the model.
         {{"chart", VELTMARQUIST_SAMPLES_DIR "/offset_press_sheet.txt", "-o", "c.txt"}, "",
-         "check: 230 chart combinations measured beyond the test form, CIEDE2000 mean 0."},
+         "check: 230 combinations measured beyond the test form, CIEDE2000 mean 0."},
         {{"chart", VELTMARQUIST_SAMPLES_DIR "/offset_press_sheet.txt", "-o", "c.txt", "--model", "ynsn"}, "",
          "chart: 900 patches (Yule-Nielsen model) written to c.txt\ncheck: 230 combinations measured beyond"},
     };
@@ -203,7 +228,21 @@ TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
         // The chart's temporary file exists when the second output fails.
         {{"multichannel", "form7.txt", "--inks", "7", "-o", "keep.txt", "--combinations", "no-folder/c.txt"}, 8,
          "no-folder/c.txt: cannot create a file in no-folder/"},
-        {{"chrat", "form7.txt"}, 2, "unknown command 'chrat'; commands: chart, compare, multichannel, convert"},
+        {{"chrat", "form7.txt"}, 2, "unknown command 'chrat'; commands: chart, report, compare, multichannel, convert"},
+        {{"--frob", "chart"}, 2, "'--frob' is not a command or --help or --version; give the command first"},
+        // An empty or unusable output, or an option value no press has, is refused before anything is read.
+        {{"chart", "twice.txt", "-o", ""}, 2, "--output: an empty path names no file"},
+        {{"chart", "twice.txt", "-o", "x.txt", "--report", ""}, 2, "--report: an empty path names no file"},
+        {{"report", "twice.txt", "-o", ""}, 2, "--output: an empty path names no file"},
+        {{"multichannel", "form7.txt", "--inks", "7", "-o", ""}, 2, "--output: an empty path names no file"},
+        {{"chart", "twice.txt", "-o", "x.ti3", "--format", "cti3", "--ink-limit", ""}, 2, "--ink-limit: '' is not a "
+         "total ink limit: give a percentage from 100 to 400, such as 300"},
+        {{"chart", "twice.txt", "-o", "x.ti3", "--format", "cti3", "--ink-limit", "1"}, 2, "'1' is not a total ink"},
+        {{"chart", "twice.txt", "-o", "x.ti3", "--format", "cti3", "--ink-limit", "0x12C"}, 2, "'0x12C' is not a"},
+        {{"chart", "twice.txt", "-o", "keep.txt", "--model", "ynsn", "--process", "gravure"}, 2,
+         "--process gravure contradicts --model ynsn"},
+        {{"compare", "twice.txt", "-o", "-"}, 2, "standard output (-) cannot hold two files"},
+        {{"chart", "twice.txt", "-o", "."}, 8, ".: is a folder; give a file name"},
         {{"chart", "keep.txt", "-o", "./keep.txt"}, 2, "./keep.txt: is the same file as the input keep.txt"},
         // Control characters from a path or a file are shown escaped.
         {{"chart", "in\x1b[2J\t.txt", "-o", "out.txt"}, 3, "in\\x1b[2J\\t.txt: cannot open"},
@@ -221,4 +260,27 @@ TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
     const ToolRun help = runTool({"chart", "--help"}, dir.dir()); // documents the exit codes
     EXPECT_EQ(help.exitCode, 0);
     EXPECT_THAT(help.out, HasSubstr("6  a patch the calculation needs is missing"));
+}
+
+TEST(Outputs, ToolWritesStandardOutputAndRemovesItsTemporaryFileWhenStopped)
+{
+    ts::TempDir dir;
+    fs::create_directory(dir.path("tmp"));
+    int status = 0;
+    waitpid(startTool(dir.path("file.txt"), dir.path("tmp"), "/dev/null"), &status, 0);
+    waitpid(startTool("-", dir.path("tmp"), dir.path("out.txt")), &status, 0);
+    EXPECT_EQ(ts::readFile(dir.path("out.txt")), ts::readFile(dir.path("file.txt"))) << "the chart alone";
+    mkfifo(dir.path("fifo").c_str(), 0600);
+    for (const int signal : {SIGTERM, SIGINT, SIGHUP}) {
+        SCOPED_TRACE(strsignal(signal));
+        // The chart waits in its temporary file for a reader of the FIFO that never comes.
+        const pid_t pid = startTool(dir.path("fifo"), dir.path("tmp"), "/dev/null");
+        for (int wait = 0; wait < 500 && entries(dir.path("tmp")) == 0; ++wait)
+            std::this_thread::sleep_for(std::chrono::milliseconds(10));
+        EXPECT_EQ(entries(dir.path("tmp")), 1) << "the temporary file did not appear";
+        kill(pid, signal);
+        waitpid(pid, &status, 0);
+        EXPECT_EQ(WIFSIGNALED(status) ? WTERMSIG(status) : -1, signal) << "status " << status;
+        EXPECT_EQ(entries(dir.path("tmp")), 0) << "a temporary file was left";
+    }
 }

@@ -1,6 +1,6 @@
 // What the tool prints: the report of a run and one-line messages on stderr.
-// Text from a file or a path can hold anything; every byte that would steer
-// a terminal (end a line, move the cursor, change colours) is shown escaped.
+// Text from a file or a path can hold anything; every character that would
+// steer a terminal or reorder the line is shown escaped (Text.h).
 #ifndef VELTMARQUIST_TOOL_MESSAGES_H
 #define VELTMARQUIST_TOOL_MESSAGES_H
 
@@ -8,10 +8,6 @@
 #include <string>
 
 namespace veltmarquist {
-
-// Control characters (C0, DEL and the C1 range U+0080-U+009F) and bytes
-// that are not UTF-8 become \t, \n, \r or \xHH; all else stays as it is.
-std::string escapeControls(const std::string& text);
 
 // One line on stderr: "veltmarquist: KIND: MESSAGE", the message escaped.
 void printMessage(const char* kind, const std::string& message);

@@ -1,7 +1,7 @@
 // The HTML report as a browser and other tools read it: well-formed XHTML
 // with every section, nothing fetched from elsewhere, file text escaped, and
 // the check's figures exactly as the text report prints them.
-#include "../../TestSupport.h"
+#include "TestSupport.h"
 #include "commands/Commands.h"
 #include "report/TextReport.h"
 
@@ -114,22 +114,21 @@ std::pair<std::string, std::string> report(const Case& run, const ts::TempDir& d
 {
     std::ostringstream text;
     if (run.inks > 0) {
-        MultiChannelOptions options;
-        options.form = run.form;
-        options.inks = run.inks;
-        options.report = dir.path("report.html");
+        MultiChannelJob job;
+        job.form = run.form;
+        job.inks = run.inks;
+        job.report = dir.path("report.html");
         MultiChannelResult result;
-        runMultiChannel(options, result);
+        runMultiChannel(job, result);
         renderMultiChannel(result, text);
     } else {
-        ChartOptions options;
-        options.form = run.form;
-        options.report = dir.path("report.html");
-        options.yuleNielsen = run.yuleNielsen;
-        options.fitGravure = run.fitGravure;
-        options.process = run.fitGravure ? VM_PROCESS_GRAVURE : VM_PROCESS_OFFSET;
+        ChartJob job;
+        job.form = run.form;
+        job.report = dir.path("report.html");
+        job.model = run.yuleNielsen ? ModelChoice::yuleNielsen
+                                    : run.fitGravure ? ModelChoice::gravureFitted : ModelChoice::offset;
         ChartResult result;
-        runChart(options, result);
+        runChart(job, result);
         renderChart(result, text);
     }
     return {ts::readFile(dir.path("report.html")), text.str()};

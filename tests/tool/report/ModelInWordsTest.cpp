@@ -33,10 +33,10 @@ TEST(ModelInWords, SaysWhatEachFittedValueDoesToADot)
     offset.model = std::make_shared<Fitted>("offset", std::vector<FittedValue>{
         {"gray difference factor (C, M, Y, K)", {0.07, -0.05, 0.0, -0.15}, ""},
         {"full correction at other inks' coverage (%)", {272}, ""}});
-    gravure.process = VM_PROCESS_GRAVURE;
+    gravure.choice = ModelChoice::gravure;
     gravure.model = std::make_shared<Fitted>("gravure", std::vector<FittedValue>{
         {"ink order", {}, "YCMK"}, {"trapping factors (red, green, blue)", {0.9, 0.85, 0.85}, ""}});
-    yuleNielsen.yuleNielsen = true;
+    yuleNielsen.choice = ModelChoice::yuleNielsen;
     std::vector<double> n(36, 1.8);
     n.front() = 1.6;
     n.back() = 2.2;

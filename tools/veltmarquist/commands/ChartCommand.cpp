@@ -1,147 +1,111 @@
-// chart: the characterisation chart of a four-colour process, and its check
-// against what the form measured beyond the test form.
+// chart FORM -o CHART: the characterisation chart of a four-colour process,
+// and its check against what the form measured beyond the test form.
 //
-// The library's 900-patch chart of processes 0 and 1 is written through
-// CalculateChart, as every host gets it; every other chart (the Yule-Nielsen
-// model's, another layout, a format for profile builders) is the export's
-// text of the model's predictions, which the Python package writes too. The
-// numbers of the check come from the fitted model, as the library's chart
-// holds them (Y limited, cut to two decimals), whatever the export holds.
+// One fit serves everything: the chart (the library's 900 patches in the
+// library's own format, which gives the bytes of CalculateChart for the
+// library's models, or an export for profile builders), the check and the
+// report.
 #include "Commands.h"
 
-#include "FourColourForm.h"
-#include "Files.h"
-#include "LibraryBlock.h"
-#include "LibraryHost.h"
+#include "CommandOptions.h"
 #include "OutputFile.h"
 #include "report/HtmlReport.h"
-#include "ToolError.h"
+#include "report/TextReport.h"
 
 #include "ChartExport.h"
 
-#include <optional>
+#include <memory>
 
 namespace veltmarquist {
 
-namespace {
-
-void writeLibraryChart(const ChartOptions& options, const FoundForm& form, const PendingOutput& output)
+void runChart(const ChartJob& job, ChartResult& result)
 {
-    Profile profile(fileStem(options.form));
-    if (options.fitGravure) {
-        RowTable rows(form.block);
-        profile.run("the gravure fit", [&](MathProfile& object) { object.calculateRGBFactors(rows.rows()); });
-    }
-    MeasurementBlock block = form.block;
-    profile.calculate(options.process, output, block);
-}
-
-Failure failureOf(exporting::ExportError::Kind kind, bool fromFile)
-{
-    using Kind = exporting::ExportError::Kind;
-    switch (kind) {
-    case Kind::Unreadable: return Failure::InputUnreadable;
-    case Kind::Syntax: return Failure::InputSyntax;
-    case Kind::Content: return Failure::InputContent;
-    case Kind::NotPredicted: return fromFile ? Failure::InputContent : Failure::Usage;
-    case Kind::Calculation: return Failure::Calculation;
-    default: return Failure::Usage;
-    }
-}
-
-// Runs a step of the export; its failures become the tool's.
-template <typename Step>
-auto exportStep(const std::string& layout, Step step)
-{
-    try {
-        return step();
-    } catch (const exporting::ExportError& error) {
-        throw ToolError(failureOf(error.kind(), !exporting::isGeneratedLayout(layout)), error.what());
-    }
-}
-
-std::vector<CheckedPatch> onChart(const std::vector<CheckedPatch>& patches)
-{
-    std::vector<CheckedPatch> chart;
-    for (const CheckedPatch& patch : patches)
-        if (patch.onChart)
-            chart.push_back(patch);
-    return chart;
-}
-
-} // namespace
-
-void runChart(const ChartOptions& options, ChartResult& result)
-{
-    const bool layoutFromFile = !exporting::isGeneratedLayout(options.layout);
-    std::vector<std::string> inputs{options.form};
+    const bool layoutFromFile = !exporting::isGeneratedLayout(job.layout);
+    std::vector<std::string> inputs{job.form};
     if (layoutFromFile)
-        inputs.push_back(options.layout);
-    refuseClashingOutputs(inputs, {options.output, options.report});
-    exporting::ExportOptions exportOptions;
-    exportOptions.format = exportStep(options.layout, [&] {
-        const auto format = exporting::chartFormatNamed(options.format);
-        if (!format)
-            throw exporting::ExportError(exporting::ExportError::Kind::Usage,
-                                         "unknown chart format '" + options.format + "'; formats: library, cti3, cgats");
-        return *format;
-    });
-    exportOptions.spectral = options.spectral;
-    exportOptions.inkLimit = options.inkLimit;
-    exportStep(options.layout, [&] { exporting::checkOptions(exportOptions); });
-    const bool libraryChart = exportOptions.format == exporting::ChartFormat::library && options.layout == "chart";
+        inputs.push_back(job.layout);
+    refuseClashingOutputs(inputs, {job.output, job.report});
+    exporting::ExportOptions options;
+    options.format = exporting::chartFormatNamed(job.format);
+    options.spectral = job.spectral;
+    options.inkLimit = job.inkLimit;
+    exporting::checkOptions(options);
 
-    result.form = readTestForm(options.form, options.read, result.formWarnings);
+    result.form = readTestForm(job.form, job.read, result.formWarnings);
     const FoundForm& form = *result.form;
-    const exporting::PatchLayout layout = exportStep(options.layout, [&] { return exporting::readLayout(options.layout); });
+    const exporting::PatchLayout layout = exporting::readLayout(job.layout);
     if (layoutFromFile)
-        result.layoutWarnings = FileWarnings{options.layout, layout.warnings};
+        result.layoutWarnings = FileWarnings{job.layout, layout.warnings};
     std::optional<PendingOutput> output, report;
-    if (!options.output.empty())
-        output.emplace(options.output);
-    if (!options.report.empty())
-        report.emplace(options.report);
-    FittedModel fit = fitChosenModel(form, options.process, options.fitGravure, options.yuleNielsen);
-    const std::vector<Cmyk> chart = characterisationChart();
-    std::vector<Triple> predicted = predictXYZ(*fit.model, chart);
-    // Without a chart, whose writing refuses a value that is not finite, the
-    // report refuses it the same way.
-    if (!output)
-        refuseNonFiniteData(xyzChartText(chart, predicted), report->name());
-    if (output && libraryChart && !options.yuleNielsen) {
-        writeLibraryChart(options, form, *output);
-    } else if (output) {
-        output->write(exportStep(options.layout, [&] {
-            return exporting::exportChart(*fit.model, exporting::provenanceOf(form.file, options.form), layout,
-                                          exportOptions);
-        }));
-    }
-    if (!libraryChart) {
+    if (!job.output.empty())
+        output.emplace(job.output);
+    if (!job.report.empty())
+        report.emplace(job.report);
+    FittedModel fit = fitModel(form, job.model);
+    if (output)
+        output->write(exporting::exportChart(*fit.model, exporting::provenanceOf(form.file, job.form), layout, options));
+    if (options.format != exporting::ChartFormat::library || job.layout != "chart") {
         result.layout = layout.description;
-        if (exportOptions.format != exporting::ChartFormat::library)
-            result.format = exportOptions.format == exporting::ChartFormat::cti3 ? "CTI3" : "CGATS";
+        if (options.format != exporting::ChartFormat::library)
+            result.format = options.format == exporting::ChartFormat::cti3 ? "CTI3" : "CGATS";
     }
     result.patches = layout.size();
     result.modelled = modelForm(form, *fit.model);
     result.fit = std::move(fit);
-    result.coverages = chart;
-    result.predicted = std::move(predicted);
-
-    // A model that predicts every coverage is checked on every combination
-    // the file measured; the library's models on the chart's combinations.
-    std::vector<Cmyk> checked = chart;
-    if (options.yuleNielsen) {
-        const std::vector<Cmyk> measured = measuredCombinations(form.file);
-        checked.insert(checked.end(), measured.begin(), measured.end());
-    }
-    result.check = checkPredictions(form.file, checked, *result.fit->model);
-    result.checkSummary = summariseChecks(result.check);
-    result.chartCheckSummary = summariseChecks(onChart(result.check));
+    result.check = checkModel(form.file, *result.fit->model);
     // Chart and report are both written before either is delivered.
     if (report)
         report->write(htmlReport(result));
     deliver(output ? &*output : nullptr, result.written);
     deliver(report ? &*report : nullptr, result.reportWritten);
+}
+
+Command setupChartCommand(CLI::App& app)
+{
+    struct Options {
+        ChartJob job;
+        ScaleOption scale;
+        ModelOption model;
+    };
+    const auto options = std::make_shared<Options>();
+    ChartJob& job = options->job;
+    CLI::App* command = app.add_subcommand(
+        "chart", "characterisation chart (XYZ) from a measured four-colour test form: the library's 900 patches, "
+                 "or a grid or target for profile builders");
+    command->add_option("FORM", job.form, "measurement file with the 46 test-form patches (any order)")
+        ->required()
+        ->check(kPath);
+    command->add_option("-o,--output", job.output, "chart file to write (- for standard output)")
+        ->required()
+        ->check(kPath);
+    command
+        ->add_option("--format", job.format,
+                     "library: the library's own XYZ chart; cti3: for profile builders (CTI3, XYZ and Lab in full "
+                     "precision); cgats: the same fields as plain CGATS.17")
+        ->check(CLI::IsMember({"library", "cti3", "cgats"}))
+        ->capture_default_str();
+    command
+        ->add_option("--layout", job.layout,
+                     "chart: the library's 900 combinations; grid: every combination of the form's 9 levels (6561); "
+                     "grid:N: N even levels per ink (--model ynsn); FILE: the device values of a CGATS target")
+        ->capture_default_str()
+        ->check(kPath);
+    command->add_flag("--spectral", job.spectral, "also write the predicted spectra, 380-730 nm (cti3, cgats)");
+    addInkLimit(*command, job.inkLimit,
+                "write TOTAL_INK_LIMIT PERCENT (100 to 400) for the profile builder's separations (cti3, cgats); "
+                "removes no patch");
+    command->add_option("--report", job.report,
+                        "also write the HTML report of the form, the fit and the check (as the report command)")
+        ->check(kPath);
+    options->model.add(*command);
+    options->scale.add(*command);
+    return {command, [options] { return std::vector<std::string>{options->job.output, options->job.report}; },
+            [options](std::ostream& report) {
+                options->job.model = options->model.choice();
+                options->job.read = options->scale.readOptions();
+                runAndRender<ChartResult>([&](ChartResult& result) { runChart(options->job, result); }, renderChart,
+                                          report);
+            }};
 }
 
 } // namespace veltmarquist

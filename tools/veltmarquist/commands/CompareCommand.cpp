@@ -1,31 +1,42 @@
-// compare: the measured and the modelled 46-step charts of the test form and
-// their colour differences, patch by patch. Both charts are written from
+// compare FORM: the measured and the modelled 46-step charts of the test form
+// and their colour differences, patch by patch. Both charts are written from
 // values by the library's XYZ chart writer; the differences are taken
 // between the X, Y, Z the two charts hold.
 #include "Commands.h"
 
-#include "FourColourForm.h"
+#include "CommandOptions.h"
+#include "Failure.h"
 #include "Files.h"
 #include "OutputFile.h"
+#include "report/TextReport.h"
+
+#include <memory>
 
 namespace veltmarquist {
 
-void runCompare(const CompareOptions& options, CompareResult& result)
+namespace {
+
+struct CompareJob {
+    std::string form;
+    std::string folder = ".";
+    ModelChoice model = ModelChoice::offset;
+    ReadOptions read;
+};
+
+void runCompare(const CompareJob& job, CompareResult& result)
 {
-    std::string folder = options.outputFolder.empty() ? "." : options.outputFolder;
-    if (folder.back() != '/')
-        folder += '/';
-    FittedModel choice;
-    choice.process = options.process;
-    choice.yuleNielsen = options.yuleNielsen;
-    const std::string stem = folder + fileStem(options.form);
-    const std::string measuredPath = stem + ".measured46.txt", modelPath = stem + "." + choice.name() + "46.txt";
-    refuseClashingOutputs({options.form}, {measuredPath, modelPath});
-    result.form = readTestForm(options.form, options.read, result.formWarnings);
+    if (isStandardOutput(job.folder))
+        throw HostError(Failure::Usage, "compare writes two charts into a folder: -o names that folder, and "
+                                        "standard output (-) cannot hold two files");
+    const std::string folder = job.folder.back() == '/' ? job.folder : job.folder + "/";
+    const std::string stem = folder + fileStem(job.form);
+    const std::string measuredPath = stem + ".measured46.txt", modelPath = stem + "." + kindOf(job.model) + "46.txt";
+    refuseClashingOutputs({job.form}, {measuredPath, modelPath});
+    result.form = readTestForm(job.form, job.read, result.formWarnings);
     PendingOutput measuredChart(measuredPath);
     PendingOutput modelChart(modelPath);
 
-    FittedModel fit = fitChosenModel(*result.form, options.process, options.fitGravure, options.yuleNielsen);
+    FittedModel fit = fitModel(*result.form, job.model);
     ModelledForm modelled = modelForm(*result.form, *fit.model);
     std::vector<Cmyk> coverages;
     std::vector<Triple> measured, modelledXYZ;
@@ -46,6 +57,37 @@ void runCompare(const CompareOptions& options, CompareResult& result)
     modelChart.commit();
     result.measuredWritten = measuredChart.name();
     result.modelWritten = modelChart.name();
+}
+
+} // namespace
+
+Command setupCompareCommand(CLI::App& app)
+{
+    struct Options {
+        CompareJob job;
+        ScaleOption scale;
+        ModelOption model;
+    };
+    const auto options = std::make_shared<Options>();
+    CLI::App* command = app.add_subcommand(
+        "compare", "measured and modelled 46-step charts of a test form and their colour differences");
+    command->add_option("FORM", options->job.form, "measurement file with the 46 test-form patches")
+        ->required()
+        ->check(kPath);
+    command
+        ->add_option("-o,--output-folder", options->job.folder,
+                     "folder for FORM.measured46.txt and FORM.offset46.txt / .gravure46.txt / .ynsn46.txt")
+        ->capture_default_str()
+        ->check(kPath);
+    options->model.add(*command);
+    options->scale.add(*command);
+    return {command, [] { return std::vector<std::string>{}; },
+            [options](std::ostream& report) {
+                options->job.model = options->model.choice();
+                options->job.read = options->scale.readOptions();
+                runAndRender<CompareResult>([&](CompareResult& result) { runCompare(options->job, result); },
+                                            renderCompare, report);
+            }};
 }
 
 } // namespace veltmarquist

@@ -1,21 +1,18 @@
-// multichannel: the six- or seven-colour spectral chart (process 3 or 5),
-// the extended C, M, Y, K combinations for the user's separation software,
-// and with its separations the XYZ chart of process 6, all on one profile.
+// multichannel FORM --inks 6|7 -o CHART: the six- or seven-colour spectral
+// chart (process 3 or 5), the extended C, M, Y, K combinations for the
+// user's separation software, and with its separations the XYZ chart of
+// process 6, all on one profile (MultiChannelRun.h).
 #include "Commands.h"
 
-#include "DecimalValues.h"
-#include "Files.h"
-#include "LibraryBlock.h"
-#include "LibraryHost.h"
+#include "CommandOptions.h"
+#include "Failure.h"
 #include "MeasurementLoading.h"
+#include "MultiChannelRun.h"
 #include "OutputFile.h"
-#include "PatchMatching.h"
-#include "ToolError.h"
 #include "report/HtmlReport.h"
+#include "report/TextReport.h"
 
 #include "Cgats.h"
-
-#include "MathProfile.h"
 
 #include <charconv>
 #include <fstream>
@@ -25,94 +22,6 @@
 namespace veltmarquist {
 
 namespace {
-
-// ---- Separations ----------------------------------------------------------------------------
-
-const char* const kExtendedSetDescriptor = "extended C, M, Y, K combinations of a multi-channel chart";
-
-std::string combinationLabel(size_t record)
-{
-    const auto& cmyk = MathProfile::ZANExtended[record];
-    return "combination " + std::to_string(record + 1) + " (" +
-           describeDevice({double(cmyk[0]), double(cmyk[1]), double(cmyk[2]), double(cmyk[3])}) + ")";
-}
-
-// The separation software's answer: one set of channel values (percent) per
-// combination, found by SAMPLE_ID 1..3499 when every set has a numeric one,
-// else in file order.
-std::vector<const MeasurementSet*> orderSeparations(const MeasurementFile& file, const std::string& path)
-{
-    std::vector<const MeasurementSet*> records(VM_EXCHANGE_RECORDS, nullptr);
-    bool numbered = true;
-    for (const MeasurementSet& set : file.sets)
-        numbered = numbered && !set.id.empty() && set.id.find_first_not_of("0123456789") == std::string::npos &&
-                   set.id.size() < 6;
-    if (numbered) {
-        for (const MeasurementSet& set : file.sets) {
-            const size_t record = std::stoul(set.id) - 1;
-            if (record >= records.size())
-                throw ToolError(Failure::InputContent, path + ":" + std::to_string(set.line) + ": sample " + set.id +
-                                                           " is not one of the combinations 1-3499");
-            if (records[record] != nullptr)
-                throw ToolError(Failure::DuplicatePatch, path + ":" + std::to_string(set.line) +
-                                                             ": duplicate patch: " + combinationLabel(record) +
-                                                             " is also on line " +
-                                                             std::to_string(records[record]->line));
-            records[record] = &set;
-        }
-    } else {
-        for (size_t i = 0; i < file.sets.size() && i < records.size(); ++i)
-            records[i] = &file.sets[i];
-        if (file.sets.size() > records.size())
-            throw ToolError(Failure::InputContent, path + ": " + std::to_string(file.sets.size()) +
-                                                       " separations for 3499 combinations");
-    }
-    for (size_t record = 0; record < records.size(); ++record)
-        if (records[record] == nullptr)
-            throw ToolError(Failure::MissingPatch, path + ": the separation of " + combinationLabel(record) +
-                                                       " is missing");
-    return records;
-}
-
-// Channel of the library for each channel of a separation: seven channels
-// map one to one; six inks put ink B on channel 6 (channel 5 stays unprinted),
-// as the six-colour model does.
-std::vector<int> separationChannels(const MeasurementFile& file, int inks, const std::string& path)
-{
-    const size_t channels = file.deviceFields.size();
-    if (channels == 7)
-        return {0, 1, 2, 3, 4, 5, 6};
-    if (channels == 6 && inks == 6)
-        return {0, 1, 2, 3, 4, 6};
-    throw ToolError(Failure::InputContent,
-                    path + ": separations need the device fields 7CLR_1 ... 7CLR_7" +
-                        (inks == 6 ? std::string(" or 6CLR_1 ... 6CLR_6") : std::string()) + "; the file has " +
-                        (channels == 0 ? std::string("none") : std::to_string(channels) + " channels"));
-}
-
-std::string combinationsText(const MeasurementBlock& block, int inks)
-{
-    CgatsTable table;
-    table.keywords = {{"ORIGINATOR", "veltmarquist"},
-                      {"DESCRIPTOR", std::string(kExtendedSetDescriptor) + ", " + std::to_string(inks) + " inks"}};
-    table.fields = {"SAMPLE_ID", "CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K"};
-    for (size_t record = 0; record < VM_EXCHANGE_RECORDS; ++record) {
-        std::vector<std::string> row{std::to_string(record + 1)};
-        for (size_t channel = 0; channel < 4; ++channel)
-            row.push_back(std::to_string(block.ints[7 * record + channel]));
-        table.rows.push_back(std::move(row));
-    }
-    return cgatsText(table);
-}
-
-// ---- What the report shows ------------------------------------------------------------------
-
-// The library's channel of each of the file's channels: six inks put ink B
-// on channel 6 (channel 5 stays unprinted).
-std::vector<size_t> libraryChannels(int inks)
-{
-    return inks == 6 ? std::vector<size_t>{0, 1, 2, 3, 4, 6} : std::vector<size_t>{0, 1, 2, 3, 4, 5, 6};
-}
 
 ColouredSpectrum coloured(const Spectrum& spectrum)
 {
@@ -140,7 +49,7 @@ std::vector<ChannelPatch> readSpectralChart(const std::string& path, int inks)
     const std::string text{std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
     const auto [table, error] = cgats::readTable(text);
     if (error)
-        throw ToolError(Failure::Internal, "the library's spectral chart cannot be read back: " + error->message);
+        throw HostError(Failure::Internal, "the library's spectral chart cannot be read back: " + error->message);
     std::vector<ChannelPatch> patches;
     for (const std::vector<std::string>& row : table.rows) {
         std::vector<double> values;
@@ -150,9 +59,9 @@ std::vector<ChannelPatch> readSpectralChart(const std::string& path, int inks)
             values.push_back(value);
         }
         if (values.size() < 7 + kSpectrumBands)
-            throw ToolError(Failure::Internal, "the library's spectral chart has a short row");
+            throw HostError(Failure::Internal, "the library's spectral chart has a short row");
         ChannelPatch patch;
-        for (size_t channel : libraryChannels(inks))
+        for (size_t channel : MultiChannelRun::libraryChannels(inks))
             patch.device.push_back(values[channel]);
         std::copy_n(values.begin() + 7, kSpectrumBands, patch.colour.spectrum.begin());
         patch.colour = coloured(patch.colour.spectrum);
@@ -162,8 +71,8 @@ std::vector<ChannelPatch> readSpectralChart(const std::string& path, int inks)
 }
 
 // Paper and solids as measured, the chart, and the tone ramps the library
-// built for it (one list of 101 tones per channel of a fresh profile).
-void collectForReport(MultiChannelResult& result, const PendingOutput& chart, MathProfile& profile)
+// built for it.
+void collectForReport(MultiChannelResult& result, const PendingOutput& chart, MultiChannelRun& run)
 {
     const std::vector<std::vector<int>>& picked = result.picked->thousandths;
     result.paperAndSolids.push_back(measuredPatch(*result.form, picked[4], result.inks, -1));
@@ -171,87 +80,105 @@ void collectForReport(MultiChannelResult& result, const PendingOutput& chart, Ma
         result.paperAndSolids.push_back(
             measuredPatch(*result.form, picked[static_cast<size_t>(ink < 4 ? ink : ink + 4)], result.inks, ink));
     result.chart = readSpectralChart(chart.temporaryPath(), result.inks);
-    for (size_t channel : libraryChannels(result.inks)) {
-        std::vector<ColouredSpectrum> ramp;
-        for (const MathProfile::ColorPatch& tone : profile.tintLists[channel]) {
-            Spectrum spectrum{};
-            std::copy_n(tone.spectrum, kSpectrumBands, spectrum.begin());
-            ramp.push_back(coloured(spectrum));
-        }
-        result.ramps.push_back(std::move(ramp));
+    for (const std::vector<Spectrum>& ramp : run.ramps()) {
+        std::vector<ColouredSpectrum> tones;
+        for (const Spectrum& tone : ramp)
+            tones.push_back(coloured(tone));
+        result.ramps.push_back(std::move(tones));
     }
 }
 
 } // namespace
 
-void runMultiChannel(const MultiChannelOptions& options, MultiChannelResult& result)
+void runMultiChannel(const MultiChannelJob& job, MultiChannelResult& result)
 {
-    refuseClashingOutputs({options.form, options.separations},
-                          {options.output, options.combinations, options.separatedOutput, options.report});
-    result.inks = options.inks;
-    result.form = loadMeasurementFile(options.form, options.read);
-    const MeasurementFile& form = *result.form;
-    result.formWarnings = {options.form, form.warnings};
-    const std::string family = std::to_string(options.inks) + "CLR_";
-    if (form.deviceFields.size() != static_cast<size_t>(options.inks))
-        throw ToolError(Failure::InputContent, options.form + ": " + std::to_string(options.inks) +
-                                                   " inks need the device fields " + family + "1 ... " + family +
-                                                   std::to_string(options.inks) + "; the file has " +
-                                                   std::to_string(form.deviceFields.size()) + " device channels");
-    result.picked = pickPatches(form, multiChannelRequests(options.inks), options.form);
-    const PickedPatches& picked = *result.picked;
+    refuseClashingOutputs({job.form, job.separations},
+                          {job.output, job.combinations, job.separatedOutput, job.report});
+    result.inks = job.inks;
+    result.form = loadMeasurementFile(job.form, job.read);
+    result.formWarnings = {job.form, result.form->warnings};
+    MultiChannelRun run(*result.form, job.form, job.inks);
+    result.picked = run.picked();
 
     // Read the separations before anything is calculated, so that a broken
     // file costs no time and leaves nothing behind.
-    MeasurementFile separations;
-    std::vector<const MeasurementSet*> records;
-    std::vector<int> channels;
-    if (!options.separations.empty()) {
-        separations = loadMeasurementFile(options.separations, options.read);
-        result.separationsWarnings = {options.separations, separations.warnings};
-        channels = separationChannels(separations, options.inks, options.separations);
-        records = orderSeparations(separations, options.separations);
+    Separations separations;
+    if (!job.separations.empty()) {
+        const MeasurementFile file = loadMeasurementFile(job.separations, job.read);
+        result.separationsWarnings = {job.separations, file.warnings};
+        separations = separationsOf(file, job.separations, job.inks);
     }
 
     // The report alone still needs the library's chart for its colours: it
     // is then written to a temporary file that is never delivered.
-    PendingOutput chart(options.output.empty() ? "/dev/null" : options.output);
+    PendingOutput chart(job.output.empty() ? "/dev/null" : job.output);
     std::unique_ptr<PendingOutput> combinations, separated, report;
-    if (!options.combinations.empty())
-        combinations = std::make_unique<PendingOutput>(options.combinations);
-    if (!options.separations.empty())
-        separated = std::make_unique<PendingOutput>(options.separatedOutput);
-    if (!options.report.empty())
-        report = std::make_unique<PendingOutput>(options.report);
+    if (!job.combinations.empty())
+        combinations = std::make_unique<PendingOutput>(job.combinations);
+    if (!job.separations.empty())
+        separated = std::make_unique<PendingOutput>(job.separatedOutput);
+    if (!job.report.empty())
+        report = std::make_unique<PendingOutput>(job.report);
 
-    std::vector<MeasuredSpectrum> spectra;
-    for (const std::vector<int>& thousandths : picked.thousandths)
-        spectra.push_back({&form.layout, &thousandths});
-    MeasurementBlock block = buildBlock(spectra, VM_EXCHANGE_BUFFER_INTS);
-    Profile profile(fileStem(options.form));
-    profile.calculate(options.inks == 6 ? VM_PROCESS_SIX_COLOUR : VM_PROCESS_SEVEN_COLOUR, chart, block);
-    collectForReport(result, chart, profile.object());
+    run.writeChart(chart);
+    collectForReport(result, chart, run);
     if (combinations)
-        combinations->write(combinationsText(block, options.inks));
-    if (separated) {
-        // The exchange buffer takes thousandths of a percent.
-        for (size_t record = 0; record < records.size(); ++record) {
-            for (size_t channel = 0; channel < 7; ++channel)
-                block.ints[7 * record + channel] = 0;
-            for (size_t channel = 0; channel < channels.size(); ++channel)
-                block.ints[7 * record + static_cast<size_t>(channels[channel])] =
-                    static_cast<int>(divideRounded(records[record]->device[channel], kDeviceUnits / 1000));
-        }
-        profile.calculate(VM_PROCESS_SEPARATED_SET, *separated, block);
-    }
+        combinations->write(run.combinationsText());
+    if (separated)
+        run.writeSeparated(separations, *separated);
 
-    result.separationsPath = options.separations;
+    result.separationsPath = job.separations;
     if (report)
         report->write(htmlReport(result));
-    deliver(options.output.empty() ? nullptr : &chart, result.chartWritten);
+    deliver(job.output.empty() ? nullptr : &chart, result.chartWritten);
     deliver(combinations.get(), result.combinationsWritten);
     deliver(separated.get(), result.separatedWritten);
     deliver(report.get(), result.reportWritten);
+}
+
+Command setupMultiChannelCommand(CLI::App& app)
+{
+    struct Options {
+        MultiChannelJob job;
+        ScaleOption scale;
+    };
+    const auto options = std::make_shared<Options>();
+    MultiChannelJob& job = options->job;
+    CLI::App* command = app.add_subcommand(
+        "multichannel", "six- or seven-colour spectral chart, extended combinations and their separated XYZ chart");
+    command->add_option("FORM", job.form, "measurement file with paper and solids (nCLR_1 ... nCLR_n fields)")
+        ->required()
+        ->check(kPath);
+    command->add_option("--inks", job.inks, "number of inks")->required()->check(CLI::IsMember({6, 7}));
+    command->add_option("-o,--output", job.output, "spectral chart to write (- for standard output)")
+        ->required()
+        ->check(kPath);
+    command->add_option("--combinations", job.combinations,
+                        "write the 3499 extended C, M, Y, K combinations (CGATS) here")
+        ->check(kPath);
+    CLI::Option* separations =
+        command->add_option("--separations", job.separations,
+                            "the separation software's channel values for the combinations (CGATS, %)")
+            ->check(kPath);
+    CLI::Option* separatedOut =
+        command->add_option("--separated-out", job.separatedOutput, "XYZ chart of the separated combinations to write")
+            ->check(kPath);
+    separations->needs(separatedOut);
+    separatedOut->needs(separations);
+    command->add_option("--report", job.report, "also write the HTML report of paper, solids, chart and ramps")
+        ->check(kPath);
+    options->scale.add(*command);
+    return {command,
+            [options] {
+                const MultiChannelJob& job = options->job;
+                return std::vector<std::string>{job.output, job.combinations, job.separatedOutput, job.report};
+            },
+            [options](std::ostream& report) {
+                options->job.read = options->scale.readOptions();
+                runAndRender<MultiChannelResult>(
+                    [&](MultiChannelResult& result) { runMultiChannel(options->job, result); }, renderMultiChannel,
+                    report);
+            }};
 }
 
 } // namespace veltmarquist

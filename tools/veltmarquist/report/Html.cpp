@@ -1,7 +1,7 @@
 // The page, its style sheet and the small pieces of every report.
 #include "Html.h"
 
-#include "Messages.h"
+#include "Text.h"
 
 #include <algorithm>
 #include <charconv>
@@ -148,18 +148,6 @@ std::string text(const std::string& raw)
         default: out += character;
         }
     }
-    return out;
-}
-
-std::string fixed(double value, int decimals)
-{
-    if (!std::isfinite(value))
-        return std::isnan(value) ? "nan" : value > 0 ? "inf" : "-inf";
-    char buffer[64];
-    const auto result = std::to_chars(buffer, buffer + sizeof buffer, value, std::chars_format::fixed, decimals);
-    std::string out(buffer, result.ptr);
-    if (out[0] == '-' && out.find_first_not_of("-0.") == std::string::npos)
-        out.erase(0, 1);
     return out;
 }
 

@@ -7,6 +7,7 @@
 #ifndef VELTMARQUIST_TOOL_HTML_H
 #define VELTMARQUIST_TOOL_HTML_H
 
+#include "Numbers.h"
 #include "Srgb.h"
 
 #include <string>
@@ -19,9 +20,11 @@ namespace veltmarquist::html {
 // shows them, then & < > " ' as character references.
 std::string text(const std::string& raw);
 
-// `value` with `decimals` digits after the point, the same in every locale;
-// never "-0.00".
-std::string fixed(double value, int decimals);
+// `value` with `decimals` digits after the point (Numbers.h's fixedText).
+inline std::string fixed(double value, int decimals)
+{
+    return fixedText(value, decimals);
+}
 // A signed value ("+1.5", "-0.3", "0.0").
 std::string signedFixed(double value, int decimals);
 

@@ -187,8 +187,9 @@ std::string heatColour(double value, bool& dark)
     return colour.hex();
 }
 
-std::string errorMap(const std::vector<CheckedPatch>& check)
+std::string errorMap(const ModelCheck& model)
 {
+    const std::vector<CheckedPatch>& check = model.patches;
     struct Cell {
         std::vector<double> values;
     };
@@ -207,7 +208,12 @@ std::string errorMap(const std::vector<CheckedPatch>& check)
         const std::string id = "error-map-k" + std::to_string(k);
         if (std::all_of(check.begin(), check.end(),
                         [&](const CheckedPatch& patch) { return blackRangeOf(patch.device[3]) != k; })) {
-            out += "<p class=\"note\" id=\"" + id + "\">" + blacks[k] + ": no combination measured.</p>\n";
+            const std::size_t leftOut = model.leftOut.byBlack[k];
+            out += "<p class=\"note\" id=\"" + id + "\">" + blacks[k] + ": " +
+                   (leftOut == 0 ? std::string("no combination measured beyond the test form")
+                                 : "no combination checked; " + std::to_string(leftOut) +
+                                       " measured ones are left out (see the summary)") +
+                   ".</p>\n";
             continue;
         }
         out += "<table class=\"heat\" id=\"" + id + "\"><caption>" + blacks[k] + "</caption>\n<tr><th></th>";
@@ -275,8 +281,8 @@ std::string worstTable(const std::vector<CheckedPatch>& check, const std::vector
 
 std::string checkSection(const ChartResult& result)
 {
-    const std::vector<CheckedPatch>& check = result.check;
-    const Summary& summary = result.checkSummary.deltaE2000;
+    const std::vector<CheckedPatch>& check = result.check.patches;
+    const Summary& summary = result.check.all.deltaE2000;
     std::vector<size_t> worst = worstFirst(check);
     worst.resize(std::min<size_t>(15, worst.size()));
     return sectionStart("check", "5 The check: " + std::to_string(summary.count) +
@@ -289,7 +295,7 @@ std::string checkSection(const ChartResult& result)
            "<h3>Where over the inks: mean " + kDeltaE00 + " by cyan, magenta and yellow, for each range of black</h3>\n"
            "<p class=\"note\">Each cell holds the mean difference of the combinations in it and their number (n); "
            "the darker the cell, the larger the difference. Hover a cell for its maximum.</p>\n" +
-           errorMap(check) + "<h3>The " + std::to_string(worst.size()) + " largest differences</h3>\n" +
+           errorMap(result.check) + "<h3>The " + std::to_string(worst.size()) + " largest differences</h3>\n" +
            worstTable(check, worst) + sectionEnd();
 }
 

@@ -37,7 +37,7 @@ std::string summarySection(const MultiChannelResult& result)
                       keyFigure(std::to_string(result.chart.size()), std::string("patches of the ") + model +
                                                                          " spectral chart") +
                       "</div>\n<h3>The file</h3>\n<table class=\"facts\">\n" +
-                      fileFacts(result.formWarnings.path, file, measurementConditions(file)) +
+                      fileFacts(result.formWarnings.path, file, provenanceOf(file)) +
                       row({"Found", "the paper and " + std::to_string(result.inks) + " solids; " +
                                         std::to_string(result.picked->setsIgnored) + " other measurements ignored"}) +
                       "</table>\n" + warningList(result.formWarnings.warnings);

@@ -35,13 +35,13 @@ std::string keyFigure(const std::string& value, const std::string& label, const 
 }
 
 std::string fileFacts(const std::string& path, const MeasurementFile& file,
-                      const std::vector<std::pair<std::string, std::string>>& conditions)
+                      const std::vector<std::pair<std::string, std::string>>& provenance)
 {
     std::string out = row({"File", text(path)}) + row({"Measurements", std::to_string(file.sets.size())}) +
                       row({"Spectra", text(file.describeSpectra())}) +
                       row({"Reflectance scale", "0\xE2\x80\x93" + text(fixed(file.scale, 0)) +
                                                     (file.scaleDetected ? " (detected)" : " (given)")});
-    for (const auto& [keyword, value] : conditions)
+    for (const auto& [keyword, value] : provenance)
         out += row({text(keyword), text(value)});
     return out;
 }
@@ -172,25 +172,47 @@ std::string checkRow(const std::string& what, const Summary& summary, const std:
                 cell("p95", fixed(summary.p95, 2)), cell("max", fixed(summary.max, 2))});
 }
 
-std::string checkFigures(const ChartResult& result)
+// Which measured combinations the check left out and why, as a sentence;
+// empty when it left none out beyond the form's own patches.
+std::string leftOutText(const ModelCheck& check)
 {
-    const bool everyCoverage = result.fit->yuleNielsen;
-    std::string out = "<h3>The check</h3>\n<p>The model's predictions, as the chart holds them, against every "
-                      "combination the file measured beyond the test form" +
-                      std::string(everyCoverage ? "" : " that the chart holds") + " (repeats averaged). " +
-                      kDeltaE00 + " by LittleCMS.</p>\n<table id=\"check-figures\">\n" +
-                      headerRow({"Combinations", "count", std::string("mean ") + kDeltaE00, "95th percentile", "max"}, 1);
-    out += checkRow(everyCoverage ? "all beyond the form" : "chart combinations beyond the form",
-                    result.checkSummary.deltaE2000, "check");
-    if (everyCoverage && result.chartCheckSummary.deltaE2000.count > 0)
-        out += checkRow("of them on the chart", result.chartCheckSummary.deltaE2000, "check-chart");
+    const LeftOut& out = check.leftOut;
+    std::string text;
+    if (out.offLevels > 0) {
+        std::string levels;
+        for (double level : check.levels)
+            levels += (levels.empty() ? "" : ", ") + fixed(level, 0);
+        text += std::to_string(out.offLevels) + " with a coverage that is none of the levels the " + check.model +
+                " model predicts (" + levels + " %)";
+    }
+    if (out.furtherInks > 0)
+        text += (text.empty() ? "" : "; ") + std::to_string(out.furtherInks) +
+                " with ink beyond C, M, Y and K, which a four-colour model does not print";
+    return text.empty() ? text : "Left out: " + text + ".";
+}
+
+std::string checkFigures(const ModelCheck& check)
+{
+    std::string out = "<h3>The check</h3>\n<p>The model's predictions, as an XYZ chart holds them, against every "
+                      "combination the file measured beyond the test form that the model predicts (repeats "
+                      "averaged). " + std::string(kDeltaE00) + " by LittleCMS.</p>\n";
+    const std::string leftOut = leftOutText(check);
+    if (!leftOut.empty())
+        out += "<p class=\"note\" id=\"check-left-out\">" + text(leftOut) + "</p>\n";
+    if (check.patches.empty())
+        return out;
+    out += "<table id=\"check-figures\">\n" +
+           headerRow({"Combinations", "count", std::string("mean ") + kDeltaE00, "95th percentile", "max"}, 1) +
+           checkRow("all beyond the form", check.all.deltaE2000, "check");
+    if (check.chart.deltaE2000.count > 0)
+        out += checkRow("of them on the chart", check.chart.deltaE2000, "check-chart");
     static const char* const blacks[] = {"black 0 %", "black 1\xE2\x80\x93" "40 %", "black 41\xE2\x80\x93" "85 %",
                                          "black 86\xE2\x80\x93" "100 %"};
     for (size_t range = 0; range < 4; ++range)
-        if (result.checkSummary.byBlack[range].count > 0)
-            out += checkRow(blacks[range], result.checkSummary.byBlack[range], "");
-    return out + "</table>\n<p>Largest difference at " +
-           text(deviceText(result.check[result.checkSummary.largest].device)) + ".</p>\n";
+        if (check.all.byBlack[range].count > 0)
+            out += checkRow(blacks[range], check.all.byBlack[range], "");
+    return out + "</table>\n<p>Largest difference at " + text(deviceText(check.patches[check.all.largest].device)) +
+           ".</p>\n";
 }
 
 std::string summarySection(const ChartResult& result, const Summary& form)
@@ -200,34 +222,35 @@ std::string summarySection(const ChartResult& result, const Summary& form)
     std::string out = sectionStart("summary", "1 Summary") + "<div class=\"figures\">\n" +
                       keyFigure("46", "test-form patches found in " + std::to_string(found.picked.setsUsed) +
                                           " of " + std::to_string(found.file.sets.size()) + " measurements") +
-                      keyFigure(text(modelName(fit).substr(4)), "print model") +
+                      keyFigure(text(describe(fit.choice).substr(4)), "print model") +
                       keyFigure(fixed(form.mean, 2), std::string("mean ") + kDeltaE00 + " of the form's 46 patches (max " +
                                                          fixed(form.max, 2) + ")");
-    if (!result.check.empty()) {
-        const Summary& check = result.checkSummary.deltaE2000;
+    if (!result.check.patches.empty()) {
+        const Summary& check = result.check.all.deltaE2000;
         out += keyFigure(fixed(check.mean, 2), std::string("mean ") + kDeltaE00 + " over " +
                                                    std::to_string(check.count) + " combinations beyond the form") +
                keyFigure(fixed(check.p95, 2), std::string("95th percentile ") + kDeltaE00) +
                keyFigure(fixed(check.max, 2), std::string("max ") + kDeltaE00);
     }
-    out += "</div>\n<h3>The file</h3>\n<table class=\"facts\">\n" + fileFacts(found.path, found.file, found.conditions) +
+    out += "</div>\n<h3>The file</h3>\n<table class=\"facts\">\n" + fileFacts(found.path, found.file, found.provenance) +
            row({"Test form", "46 patches found in " + std::to_string(found.picked.setsUsed) + " measurements" +
                                  (found.picked.averaged > 0 ? "; repeats averaged for " +
                                                                   std::to_string(found.picked.averaged) + " of them"
                                                             : "")}) +
            row({"Other measurements", std::to_string(found.picked.setsIgnored) +
-                                          (result.check.empty()
+                                          (result.check.patches.empty()
                                                ? " (none of them a combination the check can use)"
-                                               : " (the check below compares " + std::to_string(result.check.size()) +
+                                               : " (the check below compares " +
+                                                     std::to_string(result.check.patches.size()) +
                                                      " combinations among them with the model)")}) +
            "</table>\n" + warningList(result.formWarnings.warnings);
     const ModelWords words = modelInWords(fit);
-    out += "<h3>The model: " + text(modelName(fit)) + "</h3>\n<p>" + text(words.how) + "</p>\n<ul class=\"words\">\n";
+    out += "<h3>The model: " + text(describe(fit.choice)) + "</h3>\n<p>" + text(words.how) + "</p>\n<ul class=\"words\">\n";
     for (const std::string& sentence : words.values)
         out += "<li>" + text(sentence) + "</li>\n";
     out += "</ul>\n" + warningList(words.warnings);
-    if (!result.check.empty())
-        out += checkFigures(result);
+    if (!result.check.patches.empty() || result.check.leftOut.offLevels + result.check.leftOut.furtherInks > 0)
+        out += checkFigures(result.check);
     else
         out += "<p class=\"note\">The file measures nothing beyond the test form that the model could be checked "
                "on; a full characterisation sheet (IT8.7/4, ECI 2002) would add the check.</p>\n";
@@ -390,13 +413,13 @@ std::string htmlReport(const ChartResult& result)
     const ModelledForm& form = *result.modelled;
     std::vector<std::pair<std::string, std::string>> sections = {
         {"summary", "Summary"}, {"form", "Test form"}, {"spectra", "Spectra"}, {"tone-values", "Tone values"}};
-    if (!result.check.empty())
+    if (!result.check.patches.empty())
         sections.emplace_back("check", "Check");
     return pageStart("Print model report: " + result.form->path) +
-           pageHeader("Print model report", text(result.form->path) + " \xC2\xB7 " + text(modelName(*result.fit)),
+           pageHeader("Print model report", text(result.form->path) + " \xC2\xB7 " + text(describe(result.fit->choice)),
                       sections) +
            summarySection(result, form.deltaE2000) + formSection(form) + spectraSection(form) +
-           toneValueSection(form) + (result.check.empty() ? "" : checkSection(result)) + pageEnd();
+           toneValueSection(form) + (result.check.patches.empty() ? "" : checkSection(result)) + pageEnd();
 }
 
 } // namespace veltmarquist

@@ -23,10 +23,10 @@ std::string pageHeader(const std::string& title, const std::string& subtitle,
 // A key figure: a large value over a small label (both HTML); `id` names the value.
 std::string keyFigure(const std::string& value, const std::string& label, const std::string& id = "");
 
-// Table rows about a measurement file: its name, sets, spectra, scale and the
-// measurement conditions of its header.
+// Table rows about a measurement file: its name, sets, spectra, scale and
+// where its measurements came from (provenanceOf).
 std::string fileFacts(const std::string& path, const MeasurementFile& file,
-                      const std::vector<std::pair<std::string, std::string>>& conditions);
+                      const std::vector<std::pair<std::string, std::string>>& provenance);
 
 // Warnings as a list, each escaped; empty when there are none.
 std::string warningList(const std::vector<std::string>& warnings);

@@ -71,7 +71,7 @@ std::vector<std::string> gravureWords(const FittedModel& fit)
                         percent(strength) + " of its strength (trapping factor " + html::fixed(factor[i], 2) + ").");
         below += std::string(i == 1 ? " and " : ", ") + order[i + 1];
     }
-    words.push_back(fit.gravureFitted ? "Ink order and trapping factors are fitted to the measured red, green and "
+    words.push_back(fit.choice == ModelChoice::gravureFitted ? "Ink order and trapping factors are fitted to the measured red, green and "
                                         "blue overprints."
                                       : "Ink order and trapping factors are the library's defaults (--fit-gravure "
                                         "fits them to the red, green and blue overprints).");
@@ -136,25 +136,16 @@ const FittedValue& valueNamed(const PrintModel& model, const std::string& name)
     return found == values.end() ? none : *found;
 }
 
-std::string modelName(const FittedModel& fit)
-{
-    if (fit.yuleNielsen)
-        return "the Yule-Nielsen model";
-    if (fit.process == VM_PROCESS_GRAVURE)
-        return fit.gravureFitted ? "the gravure model (fitted)" : "the gravure model (defaults)";
-    return "the offset model";
-}
-
 ModelWords modelInWords(const FittedModel& fit)
 {
     ModelWords words;
-    if (fit.yuleNielsen) {
+    if (fit.choice == ModelChoice::yuleNielsen) {
         words.how = "The Yule-Nielsen model mixes the 16 measured solids and overprints in a compressed reflectance "
                     "scale (each spectrum raised to 1/n, n fitted per wavelength), with a smooth dot-area curve per "
                     "ink through its measured tints and a spreading factor per ink for dots printed over other inks; "
                     "it is fitted to all 46 patches and predicts any coverage.";
         words.values = yuleNielsenWords(*fit.model);
-    } else if (fit.process == VM_PROCESS_GRAVURE) {
+    } else if (fit.choice != ModelChoice::offset) {
         words.how = "The gravure model prints the inks one over the other: each ink's measured tint multiplies onto "
                     "what lies below it, with less strength the more ink lies below (trapping). It predicts the "
                     "form's coverage levels.";

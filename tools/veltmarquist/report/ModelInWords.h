@@ -13,9 +13,6 @@ namespace veltmarquist {
 // The fitted value whose name starts with `name`; an empty value when there is none.
 const FittedValue& valueNamed(const PrintModel& model, const std::string& name);
 
-// "the offset model", "the gravure model (fitted)", "the Yule-Nielsen model".
-std::string modelName(const FittedModel& fit);
-
 // What the model assumes, in one sentence, then one sentence per fitted
 // value (numbers included), then the fit's warnings.
 struct ModelWords {

@@ -3,6 +3,7 @@
 
 #include "Messages.h"
 #include "ModelInWords.h"
+#include "Numbers.h"
 
 #include <algorithm>
 #include <cctype>
@@ -13,24 +14,14 @@ namespace veltmarquist {
 
 namespace {
 
-// "%g" and "%.Nf" without locale surprises (the tool never sets a locale).
 std::string number(double value)
 {
-    char text[32];
-    std::snprintf(text, sizeof text, "%g", value);
-    return text;
+    return shortText(value);
 }
 
 std::string fixed(double value, int decimals = 2)
 {
-    char text[64];
-    std::snprintf(text, sizeof text, "%.*f", decimals, value);
-    return text;
-}
-
-std::string describeCmyk(const Cmyk& cmyk)
-{
-    return describeDevice(std::vector<double>(cmyk.begin(), cmyk.end()));
+    return fixedText(value, decimals);
 }
 
 void printWarnings(const FileWarnings& file)
@@ -89,15 +80,15 @@ void printYuleNielsen(const PrintModel& model, const std::string& formPath, std:
 void printModel(const FittedModel& fit, const std::string& formPath, std::ostream& out)
 {
     const PrintModel& model = *fit.model;
-    if (fit.yuleNielsen) {
+    if (fit.choice == ModelChoice::yuleNielsen) {
         printYuleNielsen(model, formPath, out);
-    } else if (fit.process == VM_PROCESS_GRAVURE) {
+    } else if (fit.choice != ModelChoice::offset) {
         static const char* const orders[] = {"CMYK", "KCMY", "YCMK", "YMKC", "YKMC"};
         const std::string order = valueNamed(model, "ink order").text;
         const long index = std::find(std::begin(orders), std::end(orders), order) - std::begin(orders);
         const std::vector<double>& factor = valueNamed(model, "trapping factors").numbers;
         out << "gravure model"
-            << (fit.gravureFitted ? " fitted to the red, green and blue overprints:\n"
+            << (fit.choice == ModelChoice::gravureFitted ? " fitted to the red, green and blue overprints:\n"
                                   : " (defaults; --fit-gravure fits them):\n")
             << "  ink order               " << order << " (" << index << ")\n"
             << "  trapping factors        red " << number(factor.at(0)) << "  green " << number(factor.at(1))
@@ -118,31 +109,12 @@ void printSummary(const std::string& what, const Summary& summary, std::ostream&
         << fixed(summary.max) << "\n";
 }
 
-void printCheck(const ChartResult& result, std::ostream& out)
+void printCheck(const ModelCheck& check, std::ostream& out)
 {
-    if (result.check.empty())
+    if (check.patches.empty() && check.leftOut.offLevels + check.leftOut.furtherInks == 0)
         return;
-    const CheckSummary& all = result.checkSummary;
-    if (!result.fit->yuleNielsen) {
-        printSummary("check: " + std::to_string(all.deltaE2000.count) +
-                         " chart combinations measured beyond the test form, CIEDE2000",
-                     all.deltaE2000, out);
-    } else {
-        printSummary("check: " + std::to_string(all.deltaE2000.count) +
-                         " combinations measured beyond the test form, CIEDE2000",
-                     all.deltaE2000, out);
-        if (result.chartCheckSummary.deltaE2000.count > 0)
-            printSummary("  " + std::to_string(result.chartCheckSummary.deltaE2000.count) + " of them on the chart:",
-                         result.chartCheckSummary.deltaE2000, out);
-        static const char* const blacks[] = {"K 0", "K 1-40", "K 41-85", "K 86-100"};
-        std::string means;
-        for (size_t range = 0; range < 4; ++range)
-            if (all.byBlack[range].count > 0)
-                means += (means.empty() ? "" : ", ") + std::string(blacks[range]) + " " +
-                         fixed(all.byBlack[range].mean) + " (" + std::to_string(all.byBlack[range].count) + ")";
-        out << "  means by black (combinations): " << means << "\n";
-    }
-    out << "  largest difference at " << describeCmyk(result.check[all.largest].device) << "\n";
+    for (const std::string& line : checkLines(check))
+        out << line << "\n";
 }
 
 void printReportWritten(const std::string& written, std::ostream& out)
@@ -175,10 +147,10 @@ void renderChart(const ChartResult& result, std::ostream& out)
             out << result.layout << ", ";
         if (!result.format.empty())
             out << result.format << ", ";
-        out << (result.fit->yuleNielsen ? "Yule-Nielsen" : result.fit->name()) << " model) written to "
+        out << result.fit->model->name() << " model) written to "
             << result.written << "\n";
     }
-    printCheck(result, out);
+    printCheck(result.check, out);
     printReportWritten(result.reportWritten, out);
 }
 
@@ -187,7 +159,7 @@ void renderCompare(const CompareResult& result, std::ostream& out)
     if (!printFormAndModel(result, out) || result.modelWritten.empty())
         return;
     out << "measured 46-step chart written to " << result.measuredWritten << "\n"
-        << "modelled 46-step chart (" << result.fit->name() << ") written to " << result.modelWritten << "\n"
+        << "modelled 46-step chart (" << kindOf(result.fit->choice) << ") written to " << result.modelWritten << "\n"
         << "patch  C    M    Y    K     dE*ab   dE00\n";
     for (size_t i = 0; i < result.modelled->patches.size(); ++i) {
         const CheckedPatch& patch = result.modelled->patches[i].check;

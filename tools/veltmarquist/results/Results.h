@@ -9,11 +9,10 @@
 #define VELTMARQUIST_TOOL_RESULTS_H
 
 #include "ColourDifference.h"
+#include "FourColourForm.h"
 #include "MeasurementFile.h"
 #include "PatchMatching.h"
 #include "PredictionCheck.h"
-#include "TestForm.h"
-#include "ToneValues.h"
 
 #include "VeltmarquistDLL.h"
 #include "models/PrintModels.h"
@@ -25,36 +24,6 @@
 #include <vector>
 
 namespace veltmarquist {
-
-// The warnings of one input file (the reader's and the paper's).
-struct FileWarnings {
-    std::string path;
-    std::vector<std::string> warnings;
-};
-
-// A four-colour model fitted to the form, and how it was chosen.
-struct FittedModel {
-    std::shared_ptr<const PrintModel> model;
-    PrintProcess process = VM_PROCESS_OFFSET; // the library's process (offset or gravure)
-    bool yuleNielsen = false;                 // the Yule-Nielsen model instead of the library's
-    bool gravureFitted = false;               // gravure order and factors fitted to red, green, blue
-
-    // "offset", "gravure" or "ynsn": in file names and the report.
-    const char* name() const { return yuleNielsen ? "ynsn" : process == VM_PROCESS_GRAVURE ? "gravure" : "offset"; }
-};
-
-// A patch of the test form, measured and as the model gives it.
-struct FormPatch {
-    CheckedPatch check;              // X, Y, Z as the 46-step charts hold them
-    Spectrum measured{}, modelled{}; // the measured one after the form's orientation check
-};
-
-// The form as the fitted model reproduces it.
-struct ModelledForm {
-    std::vector<FormPatch> patches;             // the 46, in measuring order
-    Summary deltaE2000;                         // of the 46 patches
-    std::array<ToneValueCurve, 4> toneValues{}; // C, M, Y, K: measured tints and the model's
-};
 
 // What chart and compare begin with: the form found, the model fitted.
 struct FormAndModel {
@@ -73,12 +42,9 @@ struct ChartResult : FormAndModel {
     std::vector<Cmyk> coverages;      // the library's chart's patches, as the check reads them
     std::vector<Triple> predicted;    // their X, Y, Z as the model gives them (the chart limits and cuts them)
     std::string written;              // how messages name the delivered chart; empty until delivered
-    // The combinations FORM measured beyond the test form against the
-    // model: the chart's combinations in chart order, then (for a model that
-    // predicts every coverage) all others in file order.
-    std::vector<CheckedPatch> check;
-    CheckSummary checkSummary;        // of every checked patch
-    CheckSummary chartCheckSummary;   // of those on the chart
+    // The combinations FORM measured beyond the test form that the model
+    // predicts, against the model, and those it left out.
+    ModelCheck check;
     std::string reportWritten;        // how messages name the delivered HTML report; empty until delivered
 };
 
