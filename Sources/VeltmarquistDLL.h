@@ -75,6 +75,7 @@ enum {
  *  6     VM_STATUS_UNKNOWN_MODEL           the model selector names no model here    (print models only)
  *  7     VM_STATUS_INVALID_ARGUMENT        a null or out-of-range argument           (print models only)
  *  8     VM_STATUS_COVERAGE_NOT_PREDICTED  a coverage the model does not predict     (print models only)
+ *  9     VM_STATUS_UNKNOWN_HANDLE          not a live model of this library          (print models only)
  *
  * CalculateChart returns 0 to 5. Status 2 is checked first, then status 4;
  * statuses 2, 4 and 5 write no file.
@@ -101,7 +102,8 @@ enum {
     VM_STATUS_OUT_OF_MEMORY = 5,
     VM_STATUS_UNKNOWN_MODEL = 6,
     VM_STATUS_INVALID_ARGUMENT = 7,
-    VM_STATUS_COVERAGE_NOT_PREDICTED = 8
+    VM_STATUS_COVERAGE_NOT_PREDICTED = 8,
+    VM_STATUS_UNKNOWN_HANDLE = 9
 };
 
 /* Number of ints that the measurement block of processes 3, 5 and 6 must hold:
@@ -148,8 +150,17 @@ VELTMARQUIST_API void DestroyMathProfile(void *profile);
  *     DestroyPrintModel(model);
  *
  * A model never changes once fitted: several threads may predict with one
- * model at once. Models and profiles are different handles; neither may be
- * passed where the other is expected.                                        */
+ * model at once; a model destroyed while another thread predicts with it
+ * goes once the prediction is done.
+ *
+ * Model handles are checked: the library keeps the models it handed out and
+ * not yet destroyed, and the print-model functions return status 9 for any
+ * other handle (a destroyed model, a profile, a pointer to anything else)
+ * without touching it; DestroyPrintModel leaves such a handle alone. What
+ * cannot be detected: a destroyed model's handle whose address a later fit
+ * happens to reuse names that later model. The profile functions
+ * (CalculateChart, DestroyMathProfile) check nothing: a model handle passed
+ * to them is undefined behaviour.                                            */
 enum {
     VM_MODEL_OFFSET = 0,         /* offset model, fitted to the greys as process 0 fits it; the form's levels  */
     VM_MODEL_GRAVURE = 1,        /* gravure model with the defaults of process 1; the form's levels           */
@@ -165,10 +176,18 @@ enum {
  * validation and band placement, the first 46 patches the form in measuring
  * order, the block only read. A form read in swapped halves is exchanged
  * back as process 0 does (with more than 46 patches that exchange also swaps
- * patches 22 and 46). On status 0 *fitted receives the model, otherwise null.
+ * patches 22 and 46). On status 0 *fitted receives the model; on any other
+ * status it is null.
  * Statuses, checked in this order: 2 (input kind), 6 (a selector this library
- * holds no model for), 7 (null `fitted`), 4 (the block, as for process 0),
- * then 5 (a buffer could not be allocated) or 3 (the fit failed).           */
+ * holds no model for), 7 (null `fitted`), 4 (the block), then 5 (a buffer
+ * could not be allocated) or 3 (the fit failed, or the fitted model predicts
+ * no colour for a patch of the form).
+ * Status 4 is returned for a block CalculateChart refuses with 4, a first
+ * wavelength of kind 10 that is not a multiple of 10 nm, and a form that
+ * cannot be a measurement: a value below -10 or above 1500 (reflectance
+ * -0.01 to 1.5; a block on the percent scale lies far above), or a paper
+ * that is not brighter (CIE Y) than each of the four solids, which also
+ * refuses a block of zeros or of one value.                                */
 VELTMARQUIST_API int FitPrintModel(int model, const int *measurements, int inputKind, int firstWavelength,
                                    int valuesPerPatch, int count, void **fitted);
 
@@ -177,8 +196,11 @@ VELTMARQUIST_API int FitPrintModel(int model, const int *measurements, int input
  * 0..100; Y is not limited to 100) to XYZ and L*, a*, b* to Lab; any of the
  * three may be null. None of them may overlap cmyk.
  * Status 7 for a null model, a negative count, or a null cmyk with count
- * above 0; status 8 when any coverage is not finite, lies outside 0..100 or
- * is none of the model's levels: then nothing is written.                    */
+ * above 0; status 9 for a handle that is not a live model; status 8 when any
+ * coverage is not finite, lies outside 0..100 or is none of the model's
+ * levels: then nothing is written. Status 3 when a prediction is no colour
+ * (a reflectance that is not finite or lies outside -0.01..1.5): the arrays
+ * then hold the patches before it. Status 0 never hands over such a value.   */
 VELTMARQUIST_API int PredictPrintModel(const void *model, int count, const double *cmyk, double *spectra,
                                        double *XYZ, double *Lab);
 
@@ -186,7 +208,7 @@ VELTMARQUIST_API int PredictPrintModel(const void *model, int count, const doubl
  * fitted values, and the coverage levels it predicts (the same for each ink;
  * levelCount 0: every coverage from 0 to 100 %). Any output pointer may be
  * null. Strings and arrays stay valid until the model is destroyed.
- * Status 7 for a null model.                                                 */
+ * Status 7 for a null model, 9 for a handle that is not a live model.        */
 VELTMARQUIST_API int DescribePrintModel(const void *model, const char **name, int *valueCount,
                                         const double **levels, int *levelCount);
 
@@ -195,11 +217,12 @@ VELTMARQUIST_API int DescribePrintModel(const void *model, const char **name, in
  * there are none) and its text (the gravure ink order, a warning; "" when
  * there is none). Any output pointer may be null; what they receive stays
  * valid until the model is destroyed. Status 7 for a null model or an index
- * out of range.                                                              */
+ * out of range, 9 for a handle that is not a live model.                     */
 VELTMARQUIST_API int GetPrintModelValue(const void *model, int index, const char **name, const double **numbers,
                                         int *count, const char **text);
 
-/* Destroys a model; does nothing for null.                                   */
+/* Destroys a model; does nothing for null or a handle that is not a live
+ * model (one destroyed before, a profile).                                   */
 VELTMARQUIST_API void DestroyPrintModel(void *model);
 
 #ifdef __cplusplus

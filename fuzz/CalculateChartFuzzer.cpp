@@ -97,15 +97,22 @@ void promise(bool kept, const char* what, int process, int status)
 const double kCoverages[16] = {0, 10, 20, 40, 60, 70, 80, 90, 100, 35, -0.0, -1, 100.5, HUGE_VAL, -HUGE_VAL, NAN};
 
 // FitPrintModel on the block: the documented rejection (2, 6, 7, then 4 as for
-// process 0) allocating nothing, 5 for a failing allocation, else a model. Its
+// process 0 or for a first band off the 10 nm grid) allocating nothing, 5 for
+// a failing allocation, else a model, or 4 for a form that is no measurement
+// or 3 for a fit that fails; on every status but 0 the model is null. Its
 // prediction of the coverages (at most 64 patches) refuses with 8 and writes
 // nothing exactly when one is not finite, lies outside 0..100 or is none of
-// the model's levels; otherwise it fills every array.
-void modelCall(Call call, const std::vector<int>& block, const int* coverages, std::size_t coverageInts)
+// the model's levels; otherwise it fills every array with colours (finite
+// reflectance within -0.01..1.5), or stops with 3. A destroyed model and a
+// profile are unknown handles (9).
+void modelCall(Call call, const std::vector<int>& block, const int* coverages, std::size_t coverageInts, void* profile)
 {
     Call asForm = call;
     asForm.process = VM_PROCESS_OFFSET, asForm.flags &= ~(kNullProfile | kNullPath);
-    const int p = call.process, layout = documentedRejection(asForm, false, true);
+    int layout = documentedRejection(asForm, false, true);
+    if (layout == 0 && call.inputKind == VM_INPUT_10NM && call.firstWavelength % 10 != 0)
+        layout = VM_STATUS_INVALID_MEASUREMENTS;
+    const int p = call.process;
     const int rejection = layout == VM_STATUS_UNKNOWN_INPUT_KIND ? layout
                           : p < 0 || p > 3                       ? VM_STATUS_UNKNOWN_MODEL
                           : (call.flags & kNullPath) != 0        ? VM_STATUS_INVALID_ARGUMENT
@@ -122,14 +129,19 @@ void modelCall(Call call, const std::vector<int>& block, const int* coverages, s
     if (rejection != 0 || (failingNth > 0 && allocated >= failingNth)) {
         promise(rejection != 0 ? status == rejection && allocated == 0 : status == VM_STATUS_OUT_OF_MEMORY,
                 "the documented rejection of a fit allocating nothing, or 5 for a failing allocation", p, status);
-        promise(rejection != 0 && rejection != VM_STATUS_INVALID_MEASUREMENTS ? model != nullptr : model == nullptr,
-                "no model after a failed fit", p, status);
+        promise((call.flags & kNullPath) != 0 || model == nullptr, "no model after a failed fit", p, status);
+        return;
+    }
+    if (status != VM_STATUS_OK) {
+        promise((status == VM_STATUS_INVALID_MEASUREMENTS || status == VM_STATUS_CALCULATION_FAILED) &&
+                    model == nullptr,
+                "a valid layout fits a model, or refuses its values (4) or fails (3) leaving no model", p, status);
         return;
     }
     const double* levels = nullptr;
     int levelCount = -1;
-    promise(status == VM_STATUS_OK && DescribePrintModel(model, nullptr, nullptr, &levels, &levelCount) == 0,
-            "a valid block fits a model", p, status);
+    promise(DescribePrintModel(model, nullptr, nullptr, &levels, &levelCount) == 0, "a fitted model describes itself",
+            p, status);
     std::vector<double> cmyk(std::min<std::size_t>(coverageInts / 4, 64) * 4);
     bool predicted = true;
     for (std::size_t i = 0; i < cmyk.size(); ++i) {
@@ -145,11 +157,19 @@ void modelCall(Call call, const std::vector<int>& block, const int* coverages, s
     const int predictedStatus =
         PredictPrintModel(model, static_cast<int>(n), cmyk.data(), first, first + n * 36, first + n * 39);
     DestroyPrintModel(model);
+    promise(PredictPrintModel(model, 0, nullptr, nullptr, nullptr, nullptr) == VM_STATUS_UNKNOWN_HANDLE &&
+                PredictPrintModel(profile, 0, nullptr, nullptr, nullptr, nullptr) == VM_STATUS_UNKNOWN_HANDLE,
+            "a destroyed model and a profile are unknown handles", p, predictedStatus);
+    DestroyPrintModel(model); // a second time: left alone
+    if (predicted && predictedStatus == VM_STATUS_CALCULATION_FAILED)
+        return; // a prediction that is no colour is never handed over with 0
     promise(predictedStatus == (predicted ? VM_STATUS_OK : VM_STATUS_COVERAGE_NOT_PREDICTED), "a prediction's status",
             p, predictedStatus);
     const auto untouched = static_cast<std::size_t>(std::count(out.begin(), out.end(), out.back()));
     promise(untouched == 1 + (predicted ? 0 : n * 42),
             "the requested arrays filled, or nothing written on a refusal", p, predictedStatus);
+    for (std::size_t i = 0; predicted && i < n * 36; ++i)
+        promise(first[i] >= -0.01 && first[i] <= 1.5, "every predicted reflectance a colour", p, predictedStatus);
 }
 
 } // namespace
@@ -183,7 +203,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         const std::vector<int> before = block;
         if ((call.flags & kModelCall) != 0) {
             const std::size_t behind = std::min<std::size_t>(static_cast<std::size_t>(ints), pool.size());
-            modelCall(call, block, pool.data() + behind, pool.size() - behind);
+            modelCall(call, block, pool.data() + behind, pool.size() - behind, profile);
             promise(block == before, "a fit only reads the block", p, 0);
             continue;
         }

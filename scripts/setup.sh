@@ -12,7 +12,7 @@ packages=(build-essential cmake ninja-build pkg-config
           chromium  # renders the HTML report headless (stage 70-report)
           clang libclang-rt-14-dev valgrind python3
           python3-dev python3-venv python3-pip python3-setuptools python3-build python3-wheel  # the Python package
-          pybind11-dev python3-pybind11 python3-numpy python3-pytest                        # (stage 80-python)
+          pybind11-dev python3-pybind11 python3-numpy python3-pytest python3-mypy           # (stage 80-python)
           llvm-14)  # llvm-symbolizer: sanitizer reports with file and line
 
 missing=()

@@ -5,6 +5,7 @@
 #define VELTMARQUIST_MODELS_FORMPATCHES_H
 
 #include <array>
+#include <memory>
 
 namespace veltmarquist {
 namespace models {
@@ -37,6 +38,11 @@ struct FormPatches {
 FormPatches formPatchesFromRows(const double* const* rows);
 
 } // namespace models
+
+class PrintModel;
+// A fitted model as a fit hands it over: checked on the 46 coverages of the
+// form it was fitted to (std::domain_error when one is no colour).
+std::unique_ptr<PrintModel> checkedOnForm(std::unique_ptr<PrintModel> model);
 } // namespace veltmarquist
 
 #endif // VELTMARQUIST_MODELS_FORMPATCHES_H

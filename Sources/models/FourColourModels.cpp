@@ -162,7 +162,7 @@ std::unique_ptr<PrintModel> fitOffsetModel(const MeasuredForm& form)
     FormRows rows(form);
     const auto profile = std::make_unique<MathProfile>("offset model");
     profile->calculateGrayDiffFactor(rows.table.data());
-    return std::make_unique<OffsetModel>(patchesOf(rows), profile->grayDiffFactor, profile->coverageLimit);
+    return checkedOnForm(std::make_unique<OffsetModel>(patchesOf(rows), profile->grayDiffFactor, profile->coverageLimit));
 }
 
 std::unique_ptr<PrintModel> fitGravureModel(const MeasuredForm& form, GravureFactors factors)
@@ -171,7 +171,7 @@ std::unique_ptr<PrintModel> fitGravureModel(const MeasuredForm& form, GravureFac
     const auto profile = std::make_unique<MathProfile>("gravure model"); // holds the defaults
     if (factors == GravureFactors::fittedToRedGreenBlue)
         profile->calculateRGBFactors(rows.table.data());
-    return std::make_unique<GravureModel>(patchesOf(rows), profile->inkOrder, profile->rgbFactor, factors);
+    return checkedOnForm(std::make_unique<GravureModel>(patchesOf(rows), profile->inkOrder, profile->rgbFactor, factors));
 }
 
 } // namespace veltmarquist

@@ -1,7 +1,8 @@
 // The C entry points of the print models: a fit from the measurement block
 // that CalculateChart takes, predictions into the host's arrays, the fitted
-// values for display. A model handle is the PrintModel itself. Every
-// exception becomes a status: none crosses the C boundary.
+// values for display. A model handle is the PrintModel itself, entered in a
+// registry of live models that every call looks the handle up in first.
+// Every exception becomes a status: none crosses the C boundary.
 #include "PrintModels.h"
 
 #include "Colorimetry.h"
@@ -9,8 +10,12 @@
 #include "MeasurementBlock.h"
 
 #include <algorithm>
+#include <mutex>
 #include <new>
+#include <optional>
+#include <shared_mutex>
 #include <stdexcept>
+#include <unordered_set>
 
 namespace {
 
@@ -35,6 +40,57 @@ Fit fitFor(int model)
     }
 }
 
+// The models this library handed out and has not destroyed. A handle is
+// looked up before it is used, never dereferenced first, so a destroyed model
+// or another object's handle gives a status instead of a crash. Predictions
+// hold the registry shared for their whole run, so that a model is not
+// destroyed under a prediction in another thread.
+class Registry {
+public:
+    void enter(const void* model)
+    {
+        const std::unique_lock<std::shared_mutex> lock(mutex_);
+        live_.insert(model);
+    }
+    // Removes a live model and returns true; false for any other handle.
+    bool leave(const void* model)
+    {
+        const std::unique_lock<std::shared_mutex> lock(mutex_);
+        return live_.erase(model) > 0;
+    }
+    // Runs `use` on a live model under the shared lock; VM_STATUS_UNKNOWN_HANDLE otherwise.
+    template <typename Use>
+    int with(const void* model, Use use)
+    {
+        const std::shared_lock<std::shared_mutex> lock(mutex_);
+        if (live_.count(model) == 0)
+            return VM_STATUS_UNKNOWN_HANDLE;
+        return use(*static_cast<const PrintModel*>(model));
+    }
+
+private:
+    std::shared_mutex mutex_;
+    std::unordered_set<const void*> live_;
+};
+
+Registry& registry()
+{
+    static Registry models;
+    return models;
+}
+
+void describe(const PrintModel& m, const char** name, int* valueCount, const double** levels, int* levelCount)
+{
+    if (name != nullptr)
+        *name = m.name().c_str();
+    if (valueCount != nullptr)
+        *valueCount = static_cast<int>(m.fittedValues().size());
+    if (levels != nullptr)
+        *levels = m.levels().empty() ? nullptr : m.levels().data();
+    if (levelCount != nullptr)
+        *levelCount = static_cast<int>(m.levels().size());
+}
+
 // The test form in a valid block, its rows placed and oriented as process 0 places and orients them.
 MeasuredForm formOf(const measurementblock::Rows& buffers)
 {
@@ -56,6 +112,8 @@ extern "C" {
 int FitPrintModel(int model, const int* measurements, int inputKind, int firstWavelength, int valuesPerPatch,
                   int count, void** fitted)
 {
+    if (fitted != nullptr)
+        *fitted = nullptr;
     if (inputKind != VM_INPUT_10NM && inputKind != VM_INPUT_16BAND)
         return VM_STATUS_UNKNOWN_INPUT_KIND;
     const Fit fit = fitFor(model);
@@ -63,15 +121,25 @@ int FitPrintModel(int model, const int* measurements, int inputKind, int firstWa
         return VM_STATUS_UNKNOWN_MODEL;
     if (fitted == nullptr)
         return VM_STATUS_INVALID_ARGUMENT;
-    *fitted = nullptr;
     const measurementblock::Layout layout{inputKind, firstWavelength, valuesPerPatch, count};
-    if (!measurementblock::blockValid(measurements, layout, MeasuredForm::kPatches))
+    // Bands lie on the 10 nm grid: a first band at 379 nm is no place the
+    // block can say, where CalculateChart would take it as 370 nm.
+    if (!measurementblock::blockValid(measurements, layout, MeasuredForm::kPatches) ||
+        (inputKind == VM_INPUT_10NM && firstWavelength % 10 != 0))
         return VM_STATUS_INVALID_MEASUREMENTS;
     try {
         measurementblock::Rows buffers;
         if (const int status = measurementblock::marshal(measurements, layout, buffers))
             return status;
-        *fitted = fit(formOf(buffers)).release();
+        std::optional<MeasuredForm> form;
+        try {
+            form.emplace(formOf(buffers));
+        } catch (const std::invalid_argument&) {
+            return VM_STATUS_INVALID_MEASUREMENTS; // no measured form
+        }
+        std::unique_ptr<PrintModel> made = fit(*form);
+        registry().enter(made.get());
+        *fitted = made.release();
         return VM_STATUS_OK;
     } catch (const std::bad_alloc&) {
         return VM_STATUS_OUT_OF_MEMORY;
@@ -84,30 +152,26 @@ int PredictPrintModel(const void* model, int count, const double* cmyk, double* 
 {
     if (model == nullptr || count < 0 || (count > 0 && cmyk == nullptr))
         return VM_STATUS_INVALID_ARGUMENT;
-    try {
-        static_cast<const PrintModel*>(model)->predict(static_cast<std::size_t>(count), cmyk, spectra, XYZ, Lab);
-        return VM_STATUS_OK;
-    } catch (const std::invalid_argument&) {
-        return VM_STATUS_COVERAGE_NOT_PREDICTED;
-    } catch (...) {
-        return VM_STATUS_CALCULATION_FAILED;
-    }
+    return registry().with(model, [&](const PrintModel& m) {
+        try {
+            m.predict(static_cast<std::size_t>(count), cmyk, spectra, XYZ, Lab);
+            return static_cast<int>(VM_STATUS_OK);
+        } catch (const std::invalid_argument&) {
+            return static_cast<int>(VM_STATUS_COVERAGE_NOT_PREDICTED);
+        } catch (...) {
+            return static_cast<int>(VM_STATUS_CALCULATION_FAILED);
+        }
+    });
 }
 
 int DescribePrintModel(const void* model, const char** name, int* valueCount, const double** levels, int* levelCount)
 {
     if (model == nullptr)
         return VM_STATUS_INVALID_ARGUMENT;
-    const PrintModel& m = *static_cast<const PrintModel*>(model);
-    if (name != nullptr)
-        *name = m.name().c_str();
-    if (valueCount != nullptr)
-        *valueCount = static_cast<int>(m.fittedValues().size());
-    if (levels != nullptr)
-        *levels = m.levels().empty() ? nullptr : m.levels().data();
-    if (levelCount != nullptr)
-        *levelCount = static_cast<int>(m.levels().size());
-    return VM_STATUS_OK;
+    return registry().with(model, [&](const PrintModel& m) {
+        describe(m, name, valueCount, levels, levelCount);
+        return static_cast<int>(VM_STATUS_OK);
+    });
 }
 
 int GetPrintModelValue(const void* model, int index, const char** name, const double** numbers, int* count,
@@ -115,24 +179,29 @@ int GetPrintModelValue(const void* model, int index, const char** name, const do
 {
     if (model == nullptr)
         return VM_STATUS_INVALID_ARGUMENT;
-    const std::vector<FittedValue>& values = static_cast<const PrintModel*>(model)->fittedValues();
-    if (index < 0 || static_cast<std::size_t>(index) >= values.size())
-        return VM_STATUS_INVALID_ARGUMENT;
-    const FittedValue& value = values[static_cast<std::size_t>(index)];
-    if (name != nullptr)
-        *name = value.name.c_str();
-    if (numbers != nullptr)
-        *numbers = value.numbers.empty() ? nullptr : value.numbers.data();
-    if (count != nullptr)
-        *count = static_cast<int>(value.numbers.size());
-    if (text != nullptr)
-        *text = value.text.c_str();
-    return VM_STATUS_OK;
+    return registry().with(model, [&](const PrintModel& m) {
+        const std::vector<FittedValue>& values = m.fittedValues();
+        if (index < 0 || static_cast<std::size_t>(index) >= values.size())
+            return static_cast<int>(VM_STATUS_INVALID_ARGUMENT);
+        const FittedValue& value = values[static_cast<std::size_t>(index)];
+        if (name != nullptr)
+            *name = value.name.c_str();
+        if (numbers != nullptr)
+            *numbers = value.numbers.empty() ? nullptr : value.numbers.data();
+        if (count != nullptr)
+            *count = static_cast<int>(value.numbers.size());
+        if (text != nullptr)
+            *text = value.text.c_str();
+        return static_cast<int>(VM_STATUS_OK);
+    });
 }
 
 void DestroyPrintModel(void* model)
 {
-    delete static_cast<PrintModel*>(model);
+    // Only a live model is deleted: null, a model destroyed before and any
+    // other handle are left alone.
+    if (model != nullptr && registry().leave(model))
+        delete static_cast<PrintModel*>(model);
 }
 
 } // extern "C"

@@ -4,6 +4,7 @@
 
 #include "Colorimetry.h"
 #include "FormOrientation.h"
+#include "FormPatches.h"
 #include "MathProfile.h"
 
 #include <algorithm>
@@ -29,6 +30,52 @@ double normFactor()
 {
     static const double factor = colorimetry::defaultNormFactor();
     return factor;
+}
+
+// One decimal, for the numbers of a message a person reads.
+std::string oneDecimal(double value)
+{
+    char text[400];
+    const auto written = std::to_chars(text, text + sizeof text, value, std::chars_format::fixed, 1);
+    return std::string(text, written.ptr);
+}
+
+// "C 0 M 90 Y 0 K 0": a patch of the form as people find it on the sheet.
+std::string coverageText(const Cmyk& cmyk)
+{
+    std::string text;
+    for (int ink = 0; ink < 4; ++ink)
+        text += (ink == 0 ? "" : " ") + std::string(1, kInkLetters[ink]) + " " + number(cmyk[static_cast<std::size_t>(ink)]);
+    return text;
+}
+
+bool isReflectance(double value)
+{
+    return value >= kLowestReflectance && value <= kHighestReflectance; // false for NaN
+}
+
+std::string reflectanceRange()
+{
+    return number(kLowestReflectance) + " to " + number(kHighestReflectance);
+}
+
+// Why a predicted spectrum is no colour, or an empty text.
+std::string noColour(const double* spectrum)
+{
+    for (int b = 0; b < kSpectrumBands; ++b)
+        if (!isReflectance(spectrum[b]))
+            return "the model predicts reflectance " + number(spectrum[b]) + " at " + std::to_string(380 + 10 * b) +
+                   " nm, which is no colour (reflectance lies from " + reflectanceRange() + ")";
+    return std::string();
+}
+
+// The paper and the four solids among the form's patches.
+int formPatchOf(const Cmyk& wanted)
+{
+    for (int p = 0; p < MeasuredForm::kPatches; ++p)
+        if (MeasuredForm::coverageOf(p) == wanted)
+            return p;
+    return -1;
 }
 
 } // namespace
@@ -65,9 +112,33 @@ MeasuredForm::MeasuredForm(const std::vector<Spectrum>& spectra)
         spectra_[static_cast<std::size_t>(p)] = spectrum;
         rows[p] = spectra_[static_cast<std::size_t>(p)].data();
     }
+    for (int p = 0; p < kPatches; ++p)
+        for (int b = 0; b < kSpectrumBands; ++b)
+            if (!isReflectance(spectra_[static_cast<std::size_t>(p)][static_cast<std::size_t>(b)]))
+                throw std::invalid_argument(
+                    "the patch " + coverageText(coverageOf(p)) + " (form patch " + std::to_string(p) + ") reads " +
+                    number(spectra_[static_cast<std::size_t>(p)][static_cast<std::size_t>(b)]) + " at " +
+                    std::to_string(380 + 10 * b) + " nm, which is no reflectance: reflectance factors lie from " +
+                    reflectanceRange() + " (not percent)");
     halvesExchanged_ = formorientation::readInSwappedHalves(rows, normFactor());
     if (halvesExchanged_)
         formorientation::exchangeHalves(rows);
+    // The paper is the brightest patch of a print: a form whose paper is not
+    // brighter than a solid holds swapped patches, a blank or no measurement.
+    const int paper = formPatchOf({0, 0, 0, 0});
+    const double paperY = spectrumToXYZ(spectra_[static_cast<std::size_t>(paper)])[1];
+    static const char* const inks[] = {"cyan", "magenta", "yellow", "black"};
+    for (int ink = 0; ink < 4; ++ink) {
+        Cmyk solid{0, 0, 0, 0};
+        solid[static_cast<std::size_t>(ink)] = 100;
+        const int patch = formPatchOf(solid);
+        const double solidY = spectrumToXYZ(spectra_[static_cast<std::size_t>(patch)])[1];
+        if (!(paperY > solidY))
+            throw std::invalid_argument("the paper (form patch " + std::to_string(paper) + ", Y " +
+                                        oneDecimal(paperY) + ") is not brighter than the " + inks[ink] +
+                                        " solid (form patch " + std::to_string(patch) + ", Y " + oneDecimal(solidY) +
+                                        "): a paper reflects more light than any ink on it; are they swapped?");
+    }
 }
 
 Cmyk MeasuredForm::coverageOf(int patch)
@@ -113,6 +184,9 @@ Spectrum PrintModel::predict(const Cmyk& cmyk) const
         throw std::invalid_argument(refused);
     Spectrum spectrum;
     predictAccepted(cmyk.data(), spectrum.data());
+    const std::string wrong = noColour(spectrum.data());
+    if (!wrong.empty())
+        throw std::domain_error(wrong);
     return spectrum;
 }
 
@@ -126,6 +200,9 @@ void PrintModel::predict(std::size_t count, const double* cmyk, double* spectra,
     for (std::size_t i = 0; i < count; ++i) {
         Spectrum spectrum;
         predictAccepted(cmyk + 4 * i, spectrum.data());
+        const std::string wrong = noColour(spectrum.data());
+        if (!wrong.empty())
+            throw std::domain_error("patch " + std::to_string(i) + ": " + wrong);
         if (spectra != nullptr)
             std::copy(spectrum.begin(), spectrum.end(), spectra + kSpectrumBands * i);
         if (XYZ == nullptr && Lab == nullptr)
@@ -138,6 +215,19 @@ void PrintModel::predict(std::size_t count, const double* cmyk, double* spectra,
             std::copy(lab.begin(), lab.end(), Lab + 3 * i);
         }
     }
+}
+
+std::unique_ptr<PrintModel> checkedOnForm(std::unique_ptr<PrintModel> model)
+{
+    for (int p = 0; p < MeasuredForm::kPatches; ++p) {
+        try {
+            model->predict(MeasuredForm::coverageOf(p));
+        } catch (const std::domain_error& failure) {
+            throw std::domain_error("the fitted " + model->name() + " model fails on form patch " + std::to_string(p) +
+                                    ": " + failure.what());
+        }
+    }
+    return model;
 }
 
 } // namespace veltmarquist

@@ -38,6 +38,13 @@ VELTMARQUIST_API Triple spectrumToXYZ(const Spectrum& spectrum);
 // library's tabulated cube root, as the grey and gravure fits compute it.
 VELTMARQUIST_API Triple XYZToLab(const Triple& XYZ);
 
+// The reflectance factors a measurement can hold: a few thousandths below
+// zero are instrument noise on a dark patch, fluorescent papers stay well
+// below 1.5. A value outside is no measurement (a percent scale, a
+// thousandths scale, garbage), and a prediction outside is no colour.
+constexpr double kLowestReflectance = -0.01;
+constexpr double kHighestReflectance = 1.5;
+
 // The measured four-colour test form as a value.
 //
 // It applies the library's orientation check: when the two halves of the
@@ -50,8 +57,10 @@ public:
 
     // The 46 spectra of the test form in measuring order (the order of
     // coverageOf), repeats averaged by the caller. Throws
-    // std::invalid_argument for another number of spectra or a value that is
-    // not finite.
+    // std::invalid_argument, naming the patch, for what cannot be a measured
+    // form: another number of spectra, a value that is not finite or lies
+    // outside kLowestReflectance..kHighestReflectance, or a paper (after the
+    // orientation check) whose Y is not above that of every solid.
     explicit MeasuredForm(const std::vector<Spectrum>& spectra);
 
     // C, M, Y, K of a patch of the form in measuring order (0..45).
@@ -90,13 +99,18 @@ public:
 
     // The spectrum of one coverage. Throws std::invalid_argument, naming the
     // ink and the value, for a coverage that is not finite, lies outside
-    // 0..100 % or is none of the model's levels.
+    // 0..100 % or is none of the model's levels; std::domain_error for a
+    // spectrum that is no colour (not finite, or outside
+    // kLowestReflectance..kHighestReflectance), which a fitted model never
+    // hands over.
     Spectrum predict(const Cmyk& cmyk) const;
     // `count` coverages (cmyk: 4 values each) into the caller's arrays:
     // spectra 36 values, XYZ and Lab 3 values per patch; any of the three may
     // be null. Every coverage is checked before anything is written: a
     // refusal (std::invalid_argument, naming the patch, counted from 0)
-    // leaves the arrays untouched. The arrays must not overlap `cmyk`.
+    // leaves the arrays untouched. A spectrum that is no colour throws
+    // std::domain_error naming the patch; the arrays then hold the patches
+    // before it. The arrays must not overlap `cmyk`.
     void predict(std::size_t count, const double* cmyk, double* spectra, double* XYZ, double* Lab) const;
 
 protected:
@@ -112,6 +126,9 @@ private:
     std::vector<FittedValue> values_;
     std::vector<double> levels_;
 };
+
+// Every fit checks its model on the form it was fitted to: a model that
+// predicts no colour for one of the 46 patches is refused (std::domain_error).
 
 // The offset model, its gray difference factors and coverage limit fitted to
 // the form's two greys exactly as process 0 fits them.

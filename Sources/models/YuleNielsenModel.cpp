@@ -59,7 +59,7 @@ std::unique_ptr<PrintModel> fitYuleNielsenModel(const MeasuredForm& form)
     const double* rows[MeasuredForm::kPatches];
     for (int p = 0; p < MeasuredForm::kPatches; ++p)
         rows[p] = form.spectrum(p).data();
-    return std::make_unique<YuleNielsenModel>(fitYuleNielsen(formPatchesFromRows(rows)));
+    return checkedOnForm(std::make_unique<YuleNielsenModel>(fitYuleNielsen(formPatchesFromRows(rows))));
 }
 
 } // namespace veltmarquist

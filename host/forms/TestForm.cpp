@@ -1,9 +1,11 @@
 // The test form found in a measurement file.
 #include "TestForm.h"
 
+#include "Failure.h"
 #include "MeasurementLoading.h"
 
 #include <algorithm>
+#include <stdexcept>
 
 namespace veltmarquist {
 
@@ -52,6 +54,11 @@ FoundForm findTestForm(MeasurementFile file, const std::string& path)
     }
     found.block = buildBlock(spectra);
     found.provenance = provenanceOf(found.file);
+    try {
+        found.measuredForm(); // what no model may be fitted to is refused here, naming the file
+    } catch (const std::invalid_argument& refused) {
+        throw HostError(Failure::InputContent, path + ": the test form cannot be a measurement: " + refused.what());
+    }
     return found;
 }
 

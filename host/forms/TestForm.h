@@ -40,8 +40,9 @@ struct FoundForm {
 std::vector<std::pair<std::string, std::string>> provenanceOf(const MeasurementFile& file);
 
 // Reads `path` and finds the form. HostErrors name the file (and line): an
-// unreadable file, a file without spectral or device fields, and every
-// missing patch at once.
+// unreadable file, a file without spectral or device fields, every missing
+// patch at once, and a form no model may be fitted to (MeasuredForm's rules:
+// reflectance outside -0.01..1.5, a paper not brighter than every solid).
 FoundForm findTestForm(const std::string& path, const ReadOptions& options);
 // The same for a file already read; `path` names it in messages.
 FoundForm findTestForm(MeasurementFile file, const std::string& path);

@@ -78,6 +78,8 @@ private:
         ++number_;
         if (number_ == 1 && line.substr(0, 3) == "\xEF\xBB\xBF")
             line.remove_prefix(3);
+        if (number_ == 1 && line.size() >= 40 && line.substr(36, 4) == "acsp")
+            return fail(number_, "an ICC profile, not a measurement file: give the measured CGATS file");
         if (std::memchr(line.data(), '\0', line.size()) != nullptr)
             return fail(number_, "the file holds NUL bytes: not a text file");
         return true;
@@ -227,6 +229,13 @@ std::optional<Error> Parser::run()
         if (section_ == Section::Start) {
             section_ = Section::Header;
             const std::string_view first = cells_[0];
+            // Files people take for measurements by mistake, named for what they are.
+            if (first == "BOXES")
+                return Error{number, "a chart recognition template (BOXES ...): it lays out a target for scanning "
+                                     "and holds no measurements; give the measured CGATS file"};
+            if (first.substr(0, 1) == "<")
+                return Error{number, "an XML document (" + excerpt(first) + "), not CGATS text; "
+                                     "give the measurements as CGATS"};
             const bool keywordLine = equalsIgnoringCase(first, "BEGIN_DATA_FORMAT") ||
                                      equalsIgnoringCase(first, "NUMBER_OF_FIELDS") ||
                                      equalsIgnoringCase(first, "KEYWORD") || (cells_.size() > 1 && quoted_[1]);

@@ -6,6 +6,7 @@
 #include <pybind11/pybind11.h>
 
 #include <cstddef>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -19,9 +20,15 @@ using Doubles = py::array_t<double, py::array::c_style | py::array::forcecast>;
 // Rows of `columns` values from an array whose last axis has that length:
 // one row (shape (columns,)), N rows (N, columns) or more leading axes. The
 // results of a row-wise function take the same leading axes.
+//
+// Only numbers are taken: integers and floats, as Python numbers, lists or
+// numpy arrays. Strings, bools, complex numbers, None and objects raise
+// TypeError naming `what`, as NumPy would otherwise turn them into numbers
+// without a word.
 class Rows {
 public:
-    // Throws ValueError naming `what` for another last axis.
+    // Throws TypeError naming `what` for values that are not numbers,
+    // ValueError for another last axis.
     Rows(const py::handle& array, std::size_t columns, const char* what);
     std::size_t count() const { return count_; }
     bool single() const { return leading_.empty(); } // one row without a first axis
@@ -35,6 +42,17 @@ private:
     std::vector<py::ssize_t> leading_;
     std::size_t columns_ = 0, count_ = 0;
 };
+
+// Arguments checked by their type, with TypeError naming `what`: a bool is
+// no number and a number no flag, a str no path list and None no text.
+// - a file path: str, bytes or os.PathLike, as the file system's bytes;
+std::string pathOf(const py::handle& given, const char* what);
+// - a str;
+std::string textOf(const py::handle& given, const char* what);
+// - an int or float (no bool), or None when `optional`;
+std::optional<double> numberOf(const py::handle& given, const char* what, bool optional = true);
+// - a bool (numpy's bool too).
+bool flagOf(const py::handle& given, const char* what);
 
 // A rows x columns array that owns `values` (no copy), read-only.
 py::array_t<double> matrix(std::vector<double> values, std::size_t rows, std::size_t columns);

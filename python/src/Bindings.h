@@ -28,8 +28,11 @@ struct Measurements {
 
 // The reader's options from the scale argument: None detects, 1 or 100 fix it.
 ReadOptions readOptions(std::optional<double> scale);
-// A Measurements object as given, or the file at a path read with `scale`.
-std::shared_ptr<Measurements> measurementsOf(const py::handle& given, std::optional<double> scale);
+// The scale argument as given: None or a number (TypeError otherwise).
+std::optional<double> scaleOf(const py::handle& given);
+// A Measurements object as given, or the file at a path read with `scale`;
+// TypeError naming `what` for anything else.
+std::shared_ptr<Measurements> measurementsOf(const py::handle& given, std::optional<double> scale, const char* what);
 
 void bindMeasurements(py::module_& module);
 

@@ -54,13 +54,103 @@ py::array_t<double> lab(const CheckResult& result, Lab CheckedPatch::*member)
     return matrix(std::move(values), result.patches.size(), 3);
 }
 
+// ---- Pickling: every number as it is ----------------------------------------------------------
+
+constexpr std::size_t kPatchNumbers = 19; // device 4, XYZ 3 + 3, Lab 3 + 3, dE*ab, dE00, on the chart
+
+std::vector<double> numbersOf(const CheckedPatch& patch)
+{
+    std::vector<double> numbers(patch.device.begin(), patch.device.end());
+    numbers.insert(numbers.end(), patch.measuredXYZ.begin(), patch.measuredXYZ.end());
+    numbers.insert(numbers.end(), patch.predictedXYZ.begin(), patch.predictedXYZ.end());
+    for (const Lab& lab : {patch.measuredLab, patch.predictedLab})
+        numbers.insert(numbers.end(), {lab.L, lab.a, lab.b});
+    numbers.insert(numbers.end(), {patch.deltaEab, patch.deltaE2000, patch.onChart ? 1.0 : 0.0});
+    return numbers;
+}
+
+CheckedPatch patchOf(const double* n)
+{
+    CheckedPatch patch;
+    std::copy_n(n, 4, patch.device.begin());
+    std::copy_n(n + 4, 3, patch.measuredXYZ.begin());
+    std::copy_n(n + 7, 3, patch.predictedXYZ.begin());
+    patch.measuredLab = {n[10], n[11], n[12]};
+    patch.predictedLab = {n[13], n[14], n[15]};
+    patch.deltaEab = n[16];
+    patch.deltaE2000 = n[17];
+    patch.onChart = n[18] != 0.0;
+    return patch;
+}
+
+py::tuple summaryState(const Summary& s)
+{
+    return py::make_tuple(s.count, s.mean, s.p95, s.max);
+}
+
+Summary summaryOf(const py::handle& state)
+{
+    const py::tuple t = state.cast<py::tuple>();
+    return {t[0].cast<std::size_t>(), t[1].cast<double>(), t[2].cast<double>(), t[3].cast<double>()};
+}
+
+py::tuple checkSummaryState(const CheckSummary& s)
+{
+    py::list byBlack;
+    for (const Summary& range : s.byBlack)
+        byBlack.append(summaryState(range));
+    return py::make_tuple(summaryState(s.deltaE2000), s.largest, byBlack);
+}
+
+CheckSummary checkSummaryOf(const py::handle& state)
+{
+    const py::tuple t = state.cast<py::tuple>();
+    CheckSummary s;
+    s.deltaE2000 = summaryOf(t[0]);
+    s.largest = t[1].cast<std::size_t>();
+    for (std::size_t range = 0; range < 4; ++range)
+        s.byBlack[range] = summaryOf(t[2].cast<py::list>()[range]);
+    return s;
+}
+
+py::tuple stateOf(const CheckResult& r)
+{
+    std::vector<double> patches;
+    for (const CheckedPatch& patch : r.patches) {
+        const std::vector<double> numbers = numbersOf(patch);
+        patches.insert(patches.end(), numbers.begin(), numbers.end());
+    }
+    const LeftOut& out = r.leftOut;
+    return py::make_tuple(patches, checkSummaryState(r.all), checkSummaryState(r.chart),
+                          py::make_tuple(out.formPatches, out.offLevels, out.furtherInks, out.byBlack), r.levels,
+                          r.model);
+}
+
+CheckResult fromState(const py::tuple& state)
+{
+    if (state.size() != 6)
+        throw py::value_error("not a pickled CheckResult");
+    CheckResult r;
+    const std::vector<double> patches = state[0].cast<std::vector<double>>();
+    for (std::size_t at = 0; at + kPatchNumbers <= patches.size(); at += kPatchNumbers)
+        r.patches.push_back(patchOf(&patches[at]));
+    r.all = checkSummaryOf(state[1]);
+    r.chart = checkSummaryOf(state[2]);
+    const py::tuple out = state[3].cast<py::tuple>();
+    r.leftOut = {out[0].cast<std::size_t>(), out[1].cast<std::size_t>(), out[2].cast<std::size_t>(),
+                 out[3].cast<std::array<std::size_t, 4>>()};
+    r.levels = state[4].cast<std::vector<double>>();
+    r.model = state[5].cast<std::string>();
+    return r;
+}
+
 } // namespace
 
 py::object checkModel(const Model& model, const py::object& measurements)
 {
     std::shared_ptr<Measurements> other;
     if (!measurements.is_none())
-        other = measurementsOf(measurements, std::nullopt);
+        other = measurementsOf(measurements, std::nullopt, "measurements");
     const MeasurementFile& file = other ? other->file : model.found->file;
     CheckResult result;
     {
@@ -77,10 +167,13 @@ void bindCheck(py::module_& module)
         .def_readonly("mean", &Summary::mean)
         .def_readonly("p95", &Summary::p95)
         .def_readonly("max", &Summary::max)
-        .def("__repr__", [](const Summary& s) {
-            return "Summary(count=" + std::to_string(s.count) + ", mean=" + fixedText(s.mean, 2) +
-                   ", p95=" + fixedText(s.p95, 2) + ", max=" + fixedText(s.max, 2) + ")";
-        });
+        .def("__repr__",
+             [](const Summary& s) {
+                 return "Summary(count=" + std::to_string(s.count) + ", mean=" + fixedText(s.mean, 2) +
+                        ", p95=" + fixedText(s.p95, 2) + ", max=" + fixedText(s.max, 2) + ")";
+             })
+        .def(py::pickle([](const Summary& s) { return summaryState(s); },
+                        [](const py::tuple& state) { return summaryOf(state); }));
 
     py::class_<CheckResult>(module, "CheckResult", R"(
 A model's predictions against the averaged measurements of the combinations
@@ -143,6 +236,8 @@ LittleCMS, as the tool computes them.)")
             "Measured combinations left out, by why: 'off_levels' (a coverage the model does not predict), "
             "'further_inks' (ink beyond C, M, Y, K), 'form_patches' (the test form's own, fitted).")
         .def("__len__", [](const CheckResult& r) { return r.patches.size(); })
+        .def(py::pickle([](const CheckResult& r) { return stateOf(r); },
+                        [](const py::tuple& state) { return fromState(state); }))
         .def("__str__", [](const CheckResult& r) {
             const std::string lines = report(r);
             return lines.substr(0, lines.size() - 1);

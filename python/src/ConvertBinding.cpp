@@ -12,9 +12,7 @@
 #include "models/PrintModels.h"
 
 #include <pybind11/stl.h>
-#include <pybind11/stl/filesystem.h>
 
-#include <filesystem>
 #include <map>
 #include <optional>
 
@@ -26,10 +24,12 @@ const std::map<std::string, PrintProcess> kModes = {
     {"copy", VM_PROCESS_CHART_COPY}, {"convert", VM_PROCESS_CHART_CONVERT}, {"blend", VM_PROCESS_CHART_BLEND}};
 
 py::object convertChart(const py::object& spectraGiven, const py::object& channelsGiven, const py::object& fromGiven,
-                        const py::object& toGiven, const std::string& modeName, const std::filesystem::path& path,
-                        bool cmykOnly)
+                        const py::object& toGiven, const py::object& modeGiven, const py::object& pathGiven,
+                        const py::object& cmykOnlyGiven)
 {
     const py::object conversionType = py::module_::import("veltmarquist._results").attr("Conversion");
+    const std::string modeName = textOf(modeGiven, "mode"), path = pathOf(pathGiven, "path");
+    const bool cmykOnly = flagOf(cmykOnlyGiven, "cmyk_only");
     const auto mode = kModes.find(modeName);
     if (mode == kModes.end())
         throw HostError(Failure::Usage, "unknown mode '" + modeName + "'; modes: copy, convert, blend");
@@ -73,8 +73,8 @@ py::object convertChart(const py::object& spectraGiven, const py::object& channe
     ConversionOutcome outcome;
     {
         py::gil_scoped_release released;
-        PendingOutput output(path.string());
-        outcome = veltmarquist::convertChart(conversion, output, fileStem(path.string()));
+        PendingOutput output(path);
+        outcome = veltmarquist::convertChart(conversion, output, fileStem(path));
         output.commit();
     }
     return conversionType(outcome.patches, outcome.whitesApart, outcome.blendWeight);

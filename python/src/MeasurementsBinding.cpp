@@ -9,45 +9,121 @@
 #include "models/PrintModels.h"
 
 #include <pybind11/stl.h>
-#include <pybind11/stl/filesystem.h>
-
-#include <filesystem>
 
 namespace veltmarquist::python {
 
 namespace {
 
-std::shared_ptr<Measurements> readMeasurements(const std::string& path, std::optional<double> scale)
+// The arrays of a file already read.
+std::shared_ptr<Measurements> arraysOf(std::string path, MeasurementFile file)
 {
     auto measurements = std::make_shared<Measurements>();
-    measurements->path = path;
-    const ReadOptions options = readOptions(scale);
-    {
-        py::gil_scoped_release released;
-        measurements->file = loadMeasurementFile(path, options);
-    }
-    const MeasurementFile& file = measurements->file;
-    const std::size_t sets = file.sets.size(), channels = file.deviceFields.size();
+    measurements->path = std::move(path);
+    measurements->file = std::move(file);
+    const MeasurementFile& read = measurements->file;
+    const std::size_t sets = read.sets.size(), channels = read.deviceFields.size();
     std::vector<double> device, XYZ;
-    for (const MeasurementSet& set : file.sets) {
+    for (const MeasurementSet& set : read.sets) {
         const std::vector<double> percent = set.devicePercent();
         device.insert(device.end(), percent.begin(), percent.end());
         XYZ.insert(XYZ.end(), set.XYZ.begin(), set.XYZ.end());
     }
     measurements->device = matrix(std::move(device), sets, channels);
-    measurements->XYZ = file.hasXYZ ? py::object(matrix(std::move(XYZ), sets, 3)) : py::none();
+    measurements->XYZ = read.hasXYZ ? py::object(matrix(std::move(XYZ), sets, 3)) : py::none();
     measurements->spectra = py::none();
-    if (file.layout.present()) {
+    if (read.layout.present()) {
         // The 36 bands the library makes of each set: what it computes with.
         std::vector<double> spectra;
-        for (const MeasurementSet& set : file.sets) {
+        for (const MeasurementSet& set : read.sets) {
             const std::vector<int> thousandths = thousandthsOf(set);
-            const std::vector<double> bands = libraryBands({&file.layout, &thousandths});
+            const std::vector<double> bands = libraryBands({&read.layout, &thousandths});
             spectra.insert(spectra.end(), bands.begin(), bands.end());
         }
         measurements->spectra = matrix(std::move(spectra), sets, kSpectrumBands);
     }
     return measurements;
+}
+
+std::shared_ptr<Measurements> readMeasurements(const std::string& path, std::optional<double> scale)
+{
+    const ReadOptions options = readOptions(scale);
+    MeasurementFile file;
+    {
+        py::gil_scoped_release released;
+        file = loadMeasurementFile(path, options);
+    }
+    return arraysOf(path, std::move(file));
+}
+
+// ---- Pickling: the file as read, every value exact ------------------------------------------
+
+py::tuple layoutState(const SpectralLayout& layout)
+{
+    return py::make_tuple(layout.firstNm, layout.stepNm, layout.bands);
+}
+
+SpectralLayout layoutOf(const py::handle& state)
+{
+    const py::tuple values = state.cast<py::tuple>();
+    return SpectralLayout{values[0].cast<int>(), values[1].cast<int>(), values[2].cast<int>()};
+}
+
+py::tuple stateOf(const Measurements& m)
+{
+    const MeasurementFile& file = m.file;
+    py::list sets;
+    for (const MeasurementSet& set : file.sets)
+        sets.append(py::make_tuple(set.line, py::bytes(set.id), py::bytes(set.name), set.device, set.reflectance,
+                                   set.XYZ));
+    std::vector<std::pair<py::bytes, py::bytes>> keywords;
+    for (const auto& [name, value] : file.keywords)
+        keywords.emplace_back(py::bytes(name), py::bytes(value));
+    const auto bytesOf = [](const std::vector<std::string>& texts) {
+        py::list list;
+        for (const std::string& text : texts)
+            list.append(py::bytes(text));
+        return list;
+    };
+    return py::make_tuple(py::bytes(m.path), py::bytes(file.fileType), keywords, bytesOf(file.fields),
+                          bytesOf(file.deviceFields), layoutState(file.fileLayout), layoutState(file.layout),
+                          file.scale, file.scaleDetected, file.hasXYZ, sets, bytesOf(file.warnings));
+}
+
+std::shared_ptr<Measurements> fromState(const py::tuple& state)
+{
+    if (state.size() != 12)
+        throw py::value_error("not a pickled Measurements");
+    const auto texts = [](const py::handle& list) {
+        std::vector<std::string> out;
+        for (const py::handle item : list)
+            out.push_back(item.cast<std::string>());
+        return out;
+    };
+    MeasurementFile file;
+    file.fileType = state[1].cast<std::string>();
+    for (const py::handle pair : state[2])
+        file.keywords.emplace_back(pair.cast<py::tuple>()[0].cast<std::string>(),
+                                   pair.cast<py::tuple>()[1].cast<std::string>());
+    file.fields = texts(state[3]);
+    file.deviceFields = texts(state[4]);
+    file.fileLayout = layoutOf(state[5]);
+    file.layout = layoutOf(state[6]);
+    file.scale = state[7].cast<double>();
+    file.scaleDetected = state[8].cast<bool>();
+    file.hasXYZ = state[9].cast<bool>();
+    for (const py::handle item : state[10]) {
+        const py::tuple values = item.cast<py::tuple>();
+        MeasurementSet set;
+        set.line = values[0].cast<int>();
+        set.id = values[1].cast<std::string>();
+        set.name = values[2].cast<std::string>();
+        set.device = values[3].cast<std::vector<std::int32_t>>();
+        set.reflectance = values[4].cast<std::vector<std::int32_t>>();
+        set.XYZ = values[5].cast<std::array<double, 3>>();
+        file.sets.push_back(std::move(set));
+    }
+    file.warnings = texts(state[11]);
+    return arraysOf(state[0].cast<std::string>(), std::move(file));
 }
 
 py::list texts(const MeasurementFile& file, std::string MeasurementSet::*member)
@@ -77,14 +153,23 @@ ReadOptions readOptions(std::optional<double> scale)
     return options;
 }
 
-std::shared_ptr<Measurements> measurementsOf(const py::handle& given, std::optional<double> scale)
+std::optional<double> scaleOf(const py::handle& given)
+{
+    return numberOf(given, "scale");
+}
+
+std::shared_ptr<Measurements> measurementsOf(const py::handle& given, std::optional<double> scale, const char* what)
 {
     if (py::isinstance<Measurements>(given)) {
         if (scale)
             throw py::value_error("scale applies to a file read from a path, not to Measurements already read");
         return given.cast<std::shared_ptr<Measurements>>();
     }
-    return readMeasurements(given.cast<std::filesystem::path>().string(), scale);
+    if (!py::isinstance<py::str>(given) && !py::isinstance<py::bytes>(given) &&
+        !py::isinstance(given, py::module_::import("os").attr("PathLike")))
+        throw py::type_error(std::string(what) + " must be Measurements or a path (str or os.PathLike), not " +
+                             std::string(py::str(py::type::handle_of(given).attr("__name__"))));
+    return readMeasurements(pathOf(given, what), scale);
 }
 
 void bindMeasurements(py::module_& module)
@@ -140,6 +225,8 @@ read_measurements().)")
             "spectral_layout", [](const Measurements& m) { return text(m.file.describeSpectra()); },
             "The file's spectral fields as the tool describes them.")
         .def("__len__", [](const Measurements& m) { return m.file.sets.size(); })
+        .def(py::pickle([](const Measurements& m) { return stateOf(m); },
+                        [](const py::tuple& state) { return fromState(state); }))
         .def("__repr__", [](const Measurements& m) {
             return text("<veltmarquist.Measurements " + m.path + ": " + std::to_string(m.file.sets.size()) +
                         " sets, " + m.file.describeSpectra() + ">");
@@ -147,8 +234,8 @@ read_measurements().)")
 
     module.def(
         "read_measurements",
-        [](const std::filesystem::path& path, std::optional<double> scale) {
-            return readMeasurements(path.string(), scale);
+        [](const py::object& path, const py::object& scale) {
+            return readMeasurements(pathOf(path, "path"), scaleOf(scale));
         },
         py::arg("path"), py::arg("scale") = py::none(), R"(
 Reads a measurement file as the veltmarquist tool reads it.
@@ -158,7 +245,10 @@ values; 1 or 100 fixes it (refused when the file contradicts it).
 
 Raises MissingFileError / UnreadableFileError (OSError), FileFormatError,
 ContentError or DuplicatePatchError (ValueError) with the tool's one-line
-message naming the file and line.)");
+message naming the file and line; TypeError for a path that is no str or
+os.PathLike, or a scale that is no number.
+
+Measurements pickle (the file as read travels, not its path) and deep-copy.)");
 }
 
 } // namespace veltmarquist::python

@@ -9,10 +9,9 @@
 #include "OutputFile.h"
 
 #include <pybind11/stl.h>
-#include <pybind11/stl/filesystem.h>
 
+#include <algorithm>
 #include <cctype>
-#include <filesystem>
 #include <optional>
 #include <stdexcept>
 #include <string>
@@ -63,12 +62,14 @@ ModelChoice chosenModel(const std::optional<std::string>& name, bool fitGravure)
     return ModelChoice::gravureFitted;
 }
 
-Model fitModel(const py::object& given, const std::optional<std::string>& name, bool fitGravure,
-               std::optional<double> scale)
+Model fitModel(const py::object& given, const py::object& modelGiven, const py::object& fitGravure,
+               const py::object& scale)
 {
-    const ModelChoice choice = chosenModel(name, fitGravure);
+    const std::optional<std::string> name =
+        modelGiven.is_none() ? std::nullopt : std::optional<std::string>(textOf(modelGiven, "model"));
+    const ModelChoice choice = chosenModel(name, flagOf(fitGravure, "fit_gravure"));
     Model model;
-    const std::shared_ptr<Measurements> measurements = measurementsOf(given, scale);
+    const std::shared_ptr<Measurements> measurements = measurementsOf(given, scaleOf(scale), "form");
     model.form = py::cast(measurements);
     {
         py::gil_scoped_release released;
@@ -89,10 +90,29 @@ Model fitModel(const py::object& given, const std::optional<std::string>& name, 
     return model;
 }
 
+// Coverages are percent; coverages that all lie within 0..1 (and are not all
+// zero) were most likely given as fractions: a warning says so, as 0.4 % is
+// a coverage too.
+void warnAboutFractions(const Rows& rows)
+{
+    const double* first = rows.data();
+    const double* last = first + 4 * rows.count();
+    if (rows.count() == 0 || !std::all_of(first, last, [](double c) { return c >= 0.0 && c <= 1.0; }) ||
+        std::all_of(first, last, [](double c) { return c == 0.0; }))
+        return;
+    const py::object warning = py::module_::import("veltmarquist._errors").attr("CoverageScaleWarning");
+    if (PyErr_WarnEx(warning.ptr(),
+                     "every coverage lies within 0-1, but coverages are percent (100 is a solid): multiply "
+                     "fractions by 100",
+                     2) != 0)
+        throw py::error_already_set();
+}
+
 py::tuple predict(const Model& model, const py::object& cmyk)
 {
     const py::object prediction = py::module_::import("veltmarquist._results").attr("Prediction");
     const Rows rows(cmyk, 4, "cmyk");
+    warnAboutFractions(rows);
     std::vector<double> spectra(rows.count() * kSpectrumBands), XYZ(rows.count() * 3), Lab(rows.count() * 3);
     try {
         py::gil_scoped_release released;
@@ -108,24 +128,22 @@ py::tuple predict(const Model& model, const py::object& cmyk)
                       rows.shaped(std::move(Lab), 3));
 }
 
-std::size_t writeChart(const Model& model, const std::filesystem::path& path, const py::object& layoutGiven,
-                       const std::string& format, bool spectral, std::optional<double> inkLimit,
-                       const std::optional<std::string>& created)
+std::size_t writeChart(const Model& model, const py::object& pathGiven, const py::object& layoutGiven,
+                       const py::object& format, const py::object& spectral, const py::object& inkLimit,
+                       const py::object& created)
 {
-    const std::string layoutName = py::isinstance<py::str>(layoutGiven)
-                                       ? layoutGiven.cast<std::string>()
-                                       : layoutGiven.cast<std::filesystem::path>().string();
+    const std::string path = pathOf(pathGiven, "path"), layoutName = pathOf(layoutGiven, "layout");
     exporting::ExportOptions options;
-    options.format = exporting::chartFormatNamed(format);
-    options.spectral = spectral;
-    options.inkLimit = inkLimit;
-    options.created = created.value_or("");
+    options.format = exporting::chartFormatNamed(textOf(format, "format"));
+    options.spectral = flagOf(spectral, "spectral");
+    options.inkLimit = numberOf(inkLimit, "ink_limit");
+    options.created = created.is_none() ? "" : textOf(created, "created");
     py::gil_scoped_release released;
     exporting::checkOptions(options);
+    // The form's own file and the layout file are never overwritten.
+    refuseClashingOutputs({model.found->path, exporting::isGeneratedLayout(layoutName) ? "" : layoutName}, {path});
     const exporting::PatchLayout layout = exporting::readLayout(layoutName);
-    refuseClashingOutputs({model.found->path, exporting::isGeneratedLayout(layoutName) ? "" : layoutName},
-                          {path.string()});
-    PendingOutput output(path.string());
+    PendingOutput output(path);
     output.write(exporting::exportChart(*model.fit.model, exporting::provenanceOf(model.found->file, model.found->path),
                                         layout, options));
     output.commit();
@@ -165,7 +183,14 @@ Returns Prediction(spectra, xyz, lab): reflectance at 380-730 nm (N x 36),
 XYZ (D50, 2 degree, 0-100, Y not limited) and the library's CIELAB (N x 3);
 one row gives arrays without the first axis. A coverage that is not finite,
 lies outside 0-100 % or (offset and gravure) is none of the form's levels
-raises ValueError, and nothing is predicted.)")
+raises ValueError, and nothing is predicted. Coverages must be numbers:
+strings, bools, complex numbers and None raise TypeError.
+
+Coverages are percent. When every coverage lies within 0-1 (and not all are
+0) they were most likely fractions: predict() then warns with
+CoverageScaleWarning and predicts them as the percentages given (0.4 is a
+0.4 % tint). Turn the warning into an error with
+warnings.simplefilter("error", veltmarquist.CoverageScaleWarning).)")
         .def("chart", &writeChart, py::arg("path"), py::arg("layout") = "chart", py::arg("format") = "library",
              py::arg("spectral") = false, py::arg("ink_limit") = py::none(), py::arg("created") = py::none(),
              R"(
@@ -175,14 +200,16 @@ atomically (a temporary file beside it, renamed when complete).
 layout: 'chart' (the library's 900 patches), 'grid', 'grid:N' or the path of
 a CGATS file whose C, M, Y, K to predict. format: 'library', 'cti3' or
 'cgats'. spectral adds the 36 bands and ink_limit writes TOTAL_INK_LIMIT
-(cti3 and cgats). created replaces the CREATED time (else the clock, or
-SOURCE_DATE_EPOCH). Returns the number of patches written.)")
+(cti3 and cgats; 100 to 400 %). created replaces the CREATED time (else the
+clock, or SOURCE_DATE_EPOCH). Returns the number of patches written. The
+form's own file and the layout file are never written over (UsageError).)")
         .def("check", &checkModel, py::arg("measurements") = py::none(), R"(
-Checks the model against the combinations a file measured beyond the test
-form (by default the form's own file), as the tool's chart command checks
-it: the library's models on the chart's 900 combinations, the Yule-Nielsen
-model on every combination. Returns a CheckResult; str() of it is the
-tool's summary.)")
+Checks the model against every combination a file measured beyond the test
+form that the model predicts (by default the form's own file), as the tool's
+chart command checks it: the offset and gravure models on the combinations
+whose coverages are all on the form's levels, the Yule-Nielsen model on every
+combination. Returns a CheckResult; str() of it is the tool's summary, with
+what was left out and why.)")
         .def("__getattr__",
              [](const Model& m, const std::string& name) -> py::object {
                  if (!m.attributes.contains(name))
@@ -196,9 +223,20 @@ tool's summary.)")
                      names.append(item.first);
                  return names;
              })
-        .def("__repr__", [](const Model& m) {
-            return text("<veltmarquist.Model " + std::string(nameOf(m.fit.choice)) + " fitted to " + m.found->path + ">");
-        });
+        .def("__repr__",
+             [](const Model& m) {
+                 return text("<veltmarquist.Model " + std::string(nameOf(m.fit.choice)) + " fitted to " +
+                             m.found->path + ">");
+             })
+        // A pickled model is its form and its choice: the fit is exact and
+        // repeatable, so the model is fitted again where it is unpickled.
+        .def(py::pickle(
+            [](const Model& m) { return py::make_tuple(m.form, std::string(nameOf(m.fit.choice))); },
+            [](const py::tuple& state) {
+                if (state.size() != 2)
+                    throw py::value_error("not a pickled Model");
+                return fitModel(state[0], state[1], py::bool_(false), py::none());
+            }));
 
     module.def("fit", &fitModel, py::arg("form"), py::arg("model") = py::none(), py::arg("fit_gravure") = false,
                py::arg("scale") = py::none(), R"(
@@ -213,7 +251,9 @@ coverage), as the tool's --model. fit_gravure=True is the older spelling of
 model='gravure-fitted'. scale: the reflectance scale when form is a path.
 
 Raises the tool's errors: MissingPatchError naming every missing patch,
-FileFormatError, ContentError, CalculationError, UsageError.)");
+FileFormatError, ContentError, CalculationError, UsageError; TypeError for
+arguments of the wrong type. Models pickle and deep-copy (the form travels
+with them and the model is fitted again, to the same numbers).)");
 }
 
 } // namespace veltmarquist::python

@@ -10,6 +10,7 @@
 #include "models/PrintModels.h"
 
 #include <exception>
+#include <stdexcept>
 
 namespace veltmarquist::python {
 
@@ -29,6 +30,9 @@ void translate(std::exception_ptr failure)
         std::rethrow_exception(failure);
     } catch (const HostError& error) {
         raise(error.failure(), error.what());
+    } catch (const std::domain_error& error) {
+        // A model's result that is no colour: the library refuses to hand it over.
+        raise(Failure::Calculation, error.what());
     }
 }
 

@@ -9,9 +9,7 @@
 #include "OutputFile.h"
 
 #include <pybind11/stl.h>
-#include <pybind11/stl/filesystem.h>
 
-#include <filesystem>
 #include <memory>
 #include <mutex>
 
@@ -22,24 +20,30 @@ namespace {
 // One run through both steps: process 6 predicts with the ramps that
 // process 3 or 5 left in its profile.
 struct MultiChannelChart {
+    py::object form; // the Measurements the chart was made from
+    std::string formPath;
     std::unique_ptr<MultiChannelRun> run;
     py::object combinations;
     std::mutex busy; // a profile runs one calculation at a time
 };
 
-std::shared_ptr<MultiChannelChart> writeMultiChannelChart(const py::object& given, int inks,
-                                                          const std::filesystem::path& path,
-                                                          std::optional<double> scale)
+// Runs the chart of `form` into `path`; an empty path keeps the chart in a
+// temporary file that is never delivered (an unpickled chart needs only
+// the ramps it leaves).
+std::shared_ptr<MultiChannelChart> makeChart(const std::shared_ptr<Measurements>& form, int inks,
+                                             const std::string& path)
 {
-    const std::shared_ptr<Measurements> form = measurementsOf(given, scale);
     auto chart = std::make_shared<MultiChannelChart>();
+    chart->form = py::cast(form);
+    chart->formPath = form->path;
     {
         py::gil_scoped_release released;
         chart->run = std::make_unique<MultiChannelRun>(form->file, form->path, inks);
-        refuseClashingOutputs({form->path}, {path.string()});
-        PendingOutput output(path.string());
+        refuseClashingOutputs({form->path}, {path});
+        PendingOutput output(path.empty() ? "/dev/null" : path);
         chart->run->writeChart(output);
-        output.commit();
+        if (!path.empty())
+            output.commit();
     }
     std::vector<double> combinations;
     for (const Cmyk& cmyk : chart->run->combinations())
@@ -48,8 +52,20 @@ std::shared_ptr<MultiChannelChart> writeMultiChannelChart(const py::object& give
     return chart;
 }
 
-void writeSeparatedChart(MultiChannelChart& chart, const py::object& separations, const std::filesystem::path& path)
+std::shared_ptr<MultiChannelChart> writeMultiChannelChart(const py::object& given, const py::object& inks,
+                                                          const py::object& path, const py::object& scale)
 {
+    const std::shared_ptr<Measurements> form = measurementsOf(given, scaleOf(scale), "form");
+    if (!py::isinstance<py::int_>(inks) || py::isinstance<py::bool_>(inks))
+        throw py::type_error("inks must be an int (6 or 7), not " +
+                             std::string(py::str(py::type::handle_of(inks).attr("__name__"))));
+    const long long count = inks.cast<long long>();
+    return makeChart(form, count == 6 || count == 7 ? static_cast<int>(count) : 0, pathOf(path, "path"));
+}
+
+void writeSeparatedChart(MultiChannelChart& chart, const py::object& separations, const py::object& pathGiven)
+{
+    const std::string path = pathOf(pathGiven, "path");
     // Six inks may give six columns (ink A and ink B in columns 5 and 6).
     const py::array given = py::array::ensure(separations);
     const std::size_t channels = chart.run->inks() == 6 && given && given.ndim() == 2 && given.shape(1) == 6 ? 6 : 7;
@@ -63,7 +79,8 @@ void writeSeparatedChart(MultiChannelChart& chart, const py::object& separations
                                                       ", channel " + std::to_string(channel + 1)));
     py::gil_scoped_release released;
     const std::lock_guard<std::mutex> lock(chart.busy);
-    PendingOutput output(path.string());
+    refuseClashingOutputs({chart.formPath}, {path});
+    PendingOutput output(path);
     chart.run->writeSeparated(values, output);
     output.commit();
 }
@@ -83,7 +100,16 @@ Writes the XYZ chart of the separation software's answer (process 6),
 atomically: separations holds one row per combination in the order of
 combinations, the seven channels in percent (six inks: 3499 x 6 or x 7,
 ink A and ink B in columns 5 and 6). Values are taken to a thousandth of a
-percent, as the tool takes them from a file.)");
+percent, as the tool takes them from a file.)")
+        // A pickled chart is its form and its ink count: unpickled, the chart
+        // is made again (not written) for its ramps and combinations.
+        .def(py::pickle(
+            [](const MultiChannelChart& chart) { return py::make_tuple(chart.form, chart.run->inks()); },
+            [](const py::tuple& state) {
+                if (state.size() != 2)
+                    throw py::value_error("not a pickled MultiChannelChart");
+                return makeChart(state[0].cast<std::shared_ptr<Measurements>>(), state[1].cast<int>(), "");
+            }));
 
     module.def("multichannel_chart", &writeMultiChannelChart, py::arg("form"), py::arg("inks"), py::arg("path"),
                py::kw_only(), py::arg("scale") = py::none(), R"(

@@ -1,8 +1,11 @@
 """The package's arrays, exceptions, files and threads."""
+import copy
 import os
+import pickle
 import re
 import signal
 import threading
+import warnings
 
 import numpy as np
 import pytest
@@ -118,7 +121,7 @@ ERRORS = {
     "six inks from a four-colour form": (lambda m: veltmarquist.multichannel_chart(SHEET, 6, "x"),
                                          veltmarquist.ContentError, "6 inks need the device fields 6CLR_1"),
     "five inks": (lambda m: veltmarquist.multichannel_chart(SHEET, 5, "x"), veltmarquist.UsageError,
-                  "a multi-channel form has 6 or 7 inks, not 5"),
+                  "a multi-channel form has 6 or 7 inks"),
     "a spreadsheet": (lambda m: veltmarquist.read_measurements(write("a.csv", "C;M;Y;K\n1;2;3;4\n")),
                       veltmarquist.FileFormatError, "save it as CGATS text"),
     "one id, two patches": (lambda m: veltmarquist.read_measurements(write("d.txt", DUPLICATE)),
@@ -243,3 +246,73 @@ def test_two_models_fit_and_predict_in_two_threads(offset, ynsn):
     for name, runs in results.items():
         for xyz in runs:
             np.testing.assert_array_equal(xyz, expected[name])
+
+
+TYPES = {  # call: the argument the TypeError names
+    "fit(None)": (lambda m: veltmarquist.fit(None), "form must be Measurements or a path"),
+    "fit(model=3)": (lambda m: veltmarquist.fit(SHEET, model=3), "model must be a str"),
+    "fit(scale=True)": (lambda m: veltmarquist.fit(SHEET, scale=True), "scale must be a number or None"),
+    "chart(layout=array)": (lambda m: m.chart("x", layout=np.zeros(3)), "layout must be a path"),
+    "chart(None)": (lambda m: m.chart(None), "path must be a path"),
+    "chart(spectral=1)": (lambda m: m.chart("x", format="cti3", spectral=1), "spectral must be True or False"),
+    "chart(ink_limit='300')": (lambda m: m.chart("x", format="cti3", ink_limit="300"), "ink_limit must be a number"),
+    "predict(strings)": (lambda m: m.predict(["40", "40", "40", "0"]), "cmyk must hold numbers"),
+    "predict(bools)": (lambda m: m.predict([True, False, False, False]), "cmyk must hold numbers"),
+    "predict(complex)": (lambda m: m.predict([40j, 0, 0, 0]), "cmyk must hold numbers"),
+    "predict(None)": (lambda m: m.predict(None), "cmyk must hold numbers (int or float), not NoneType"),
+    "multichannel_chart(inks=7.0)": (lambda m: veltmarquist.multichannel_chart(SHEET, 7.0, "x"), "inks must be an int"),
+    "convert_chart(mode=None)": (lambda m: veltmarquist.convert_chart(np.full((1, 36), .5), np.zeros((1, 4)), None,
+                                                                       None, None, "x"), "mode must be a str"),
+}
+
+
+@pytest.mark.parametrize("call, message", TYPES.values(), ids=TYPES.keys())
+def test_arguments_of_the_wrong_type_raise_type_error_naming_them(offset, tmp_path, monkeypatch, call, message):
+    monkeypatch.chdir(tmp_path)
+    with pytest.raises(TypeError, match=re.escape(message)):
+        call(offset)
+    assert os.listdir(tmp_path) == []
+
+
+def test_coverages_within_0_to_1_warn_that_they_are_percent(ynsn):
+    with pytest.warns(veltmarquist.CoverageScaleWarning, match="coverages are percent"):
+        fractions = ynsn.predict([0.4, 0.4, 0.4, 0])
+    assert fractions.xyz[1] > ynsn.predict([40, 40, 40, 0]).xyz[1]  # 0.4 % is taken as it is: almost paper
+    with warnings.catch_warnings():
+        warnings.simplefilter("error")
+        ynsn.predict([[0, 0, 0, 0], [0, 0, 0, 0]])  # paper, not fractions
+        ynsn.predict([1, 0, 0, 2])  # a value above 1: percent
+
+
+def test_results_pickle_and_deep_copy(ynsn, tmp_path):
+    check = ynsn.check()
+    chart = veltmarquist.multichannel_chart(SAMPLES / "seven_ink_form.txt", 7, tmp_path / "chart.txt")
+    for result in (ynsn.form, ynsn, check, check.summary, chart):
+        for copied in (pickle.loads(pickle.dumps(result)), copy.deepcopy(result)):
+            assert type(copied) is type(result) and copied is not result
+    again = pickle.loads(pickle.dumps(ynsn))
+    np.testing.assert_array_equal(again.predict([10, 20, 30, 40]).spectra, ynsn.predict([10, 20, 30, 40]).spectra)
+    np.testing.assert_array_equal(pickle.loads(pickle.dumps(ynsn.form)).spectra, ynsn.form.spectra)
+    restored = pickle.loads(pickle.dumps(check))
+    assert str(restored) == str(check) and restored.left_out == check.left_out
+    np.testing.assert_array_equal(restored.delta_e_2000, check.delta_e_2000)
+    np.testing.assert_array_equal(pickle.loads(pickle.dumps(chart)).combinations, chart.combinations)
+    assert os.listdir(tmp_path) == ["chart.txt"]  # an unpickled chart is made again, not written
+
+
+def test_no_call_writes_over_a_file_it_read(tmp_path):
+    form, seven, layout = tmp_path / "form.txt", tmp_path / "seven.txt", tmp_path / "layout.txt"
+    for source, copy_to in ((SAMPLES / "offset_form.txt", form), (SAMPLES / "seven_ink_form.txt", seven),
+                            (SAMPLES / "offset_form.txt", layout)):
+        copy_to.write_bytes(source.read_bytes())
+    model = veltmarquist.fit(form)
+    chart = veltmarquist.multichannel_chart(seven, 7, tmp_path / "chart.txt")
+    calls = [lambda: model.chart(form), lambda: model.chart(tmp_path / "." / "form.txt", format="cti3"),
+             lambda: model.chart(layout, layout=layout, format="cti3"),
+             lambda: veltmarquist.multichannel_chart(seven, 7, seven),
+             lambda: chart.separated_chart(np.hstack([chart.combinations, np.zeros((3499, 3))]), seven)]
+    for call in calls:
+        with pytest.raises(veltmarquist.UsageError, match="is the same file as the input"):
+            call()
+    assert form.read_bytes() == (SAMPLES / "offset_form.txt").read_bytes()
+    assert seven.read_bytes() == (SAMPLES / "seven_ink_form.txt").read_bytes()

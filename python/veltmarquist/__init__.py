@@ -14,8 +14,9 @@ same numbers and byte-identical chart files::
 Every calculation releases the GIL; a model may predict in several threads at once. Failures
 raise the tool's one-line messages (see ``veltmarquist.Error`` and its subclasses).
 """
-from ._errors import (CalculationError, ContentError, DuplicatePatchError, Error, FileFormatError,
-                      MissingFileError, MissingPatchError, OutputError, UnreadableFileError, UsageError)
+from ._errors import (CalculationError, ContentError, CoverageScaleWarning, DuplicatePatchError, Error,
+                      FileFormatError, MissingFileError, MissingPatchError, OutputError, UnreadableFileError,
+                      UsageError)
 from ._results import Conversion, Prediction
 from ._veltmarquist import (CheckResult, Measurements, Model, MultiChannelChart, Summary, chart_xyz,
                             convert_chart, delta_e_2000, delta_e_ab, fit, multichannel_chart,
@@ -24,8 +25,8 @@ from ._veltmarquist import (CheckResult, Measurements, Model, MultiChannelChart,
 __version__ = "1.0.0"
 
 __all__ = [
-    "CalculationError", "CheckResult", "ContentError", "Conversion", "DuplicatePatchError", "Error",
-    "FileFormatError", "Measurements", "MissingFileError", "MissingPatchError", "Model",
+    "CalculationError", "CheckResult", "ContentError", "Conversion", "CoverageScaleWarning", "DuplicatePatchError",
+    "Error", "FileFormatError", "Measurements", "MissingFileError", "MissingPatchError", "Model",
     "MultiChannelChart", "OutputError", "Prediction", "Summary", "UnreadableFileError", "UsageError",
     "chart_xyz", "convert_chart", "delta_e_2000", "delta_e_ab", "fit", "multichannel_chart",
     "read_measurements", "spectra_to_xyz", "xyz_to_lab",

@@ -67,6 +67,10 @@ class CalculationError(Error):
     exit_code = 9
 
 
+class CoverageScaleWarning(UserWarning):
+    """Coverages that all lie within 0-1: coverages are percent, so these were most likely fractions."""
+
+
 _BY_EXIT_CODE = {cls.exit_code: cls for cls in (UsageError, UnreadableFileError, FileFormatError, ContentError,
                                                  MissingPatchError, DuplicatePatchError, OutputError,
                                                  CalculationError)}

@@ -17,7 +17,7 @@ using namespace veltmarquist;
 
 namespace {
 
-using Model = std::unique_ptr<PrintModel>;
+using Model = std::shared_ptr<const PrintModel>;
 
 MeasuredForm formOf(const std::string& golden, bool swapHalves = false)
 {
@@ -39,7 +39,7 @@ Model fittedFromC(int selector, const std::string& golden)
     EXPECT_EQ(FitPrintModel(selector, block.ints.data(), block.inputKind, block.firstWavelength,
                             block.valuesPerPatch, block.count, &handle),
               VM_STATUS_OK);
-    return Model(static_cast<PrintModel*>(handle));
+    return Model(static_cast<PrintModel*>(handle), DestroyPrintModel);
 }
 
 } // namespace
@@ -127,6 +127,70 @@ TEST(PrintModels, RefuseCoveragesTheyDoNotPredictAndWriteNothing)
     }
     EXPECT_EQ(refusal([] { MeasuredForm(std::vector<Spectrum>(45)); }),
               "a measured form holds the 46 spectra of the test form; 45 were given");
+}
+
+// What cannot be a measured form is refused by every model, at the C door
+// with status 4 and *fitted null; a fitted model's handle stays checked.
+TEST(PrintModelEntryPoints, FormsThatAreNoMeasurementAndHandlesThatAreNoModel)
+{
+    const MeasurementBlock golden = readGoldenInput("offset-form.in");
+    auto altered = [&](const std::function<void(std::vector<int>&)>& change) {
+        std::vector<int> ints = golden.ints;
+        change(ints);
+        return ints;
+    };
+    auto patch = [](std::vector<int>& ints, int p, int value) {
+        std::fill_n(ints.begin() + 36 * p, 36, value);
+    };
+    const struct {
+        const char* what;
+        std::vector<int> block;
+        int firstWavelength;
+    } forms[] = {
+        {"all zero", std::vector<int>(golden.ints.size(), 0), 380},
+        {"all INT_MAX", std::vector<int>(golden.ints.size(), std::numeric_limits<int>::max()), 380},
+        {"all -1000", std::vector<int>(golden.ints.size(), -1000), 380},
+        {"one value everywhere", std::vector<int>(golden.ints.size(), 500), 380},
+        {"percent scale", altered([](std::vector<int>& ints) { for (int& v : ints) v *= 100; }), 380},
+        {"a band at -0.011", altered([](std::vector<int>& ints) { ints[36 * 5 + 3] = -11; }), 380},
+        {"a band at 1.501", altered([](std::vector<int>& ints) { ints[36 * 7 + 30] = 1501; }), 380},
+        {"paper darker than the cyan solid", altered([&](std::vector<int>& ints) { patch(ints, 1, 40); }), 380},
+        {"first band at 379 nm", golden.ints, 379},
+    };
+    for (const int selector : {VM_MODEL_OFFSET, VM_MODEL_GRAVURE, VM_MODEL_GRAVURE_FITTED, VM_MODEL_YULE_NIELSEN})
+        for (const auto& form : forms) {
+            void* handle = &handle;
+            EXPECT_EQ(FitPrintModel(selector, form.block.data(), 10, form.firstWavelength, 36, 46, &handle),
+                      VM_STATUS_INVALID_MEASUREMENTS)
+                << form.what << ", model " << selector;
+            EXPECT_EQ(handle, nullptr) << form.what;
+        }
+    // Noise a few thousandths below zero on a dark patch is a measurement.
+    void* handle = &handle;
+    const std::vector<int> noisy = altered([](std::vector<int>& ints) { ints[36 * 5 + 3] = -10; });
+    EXPECT_EQ(FitPrintModel(VM_MODEL_YULE_NIELSEN, noisy.data(), 10, 380, 36, 46, &handle), VM_STATUS_OK);
+    for (int kind : {15, 10}) { // status 2, then 6: *fitted is null after any status
+        void* other = &other;
+        EXPECT_NE(FitPrintModel(kind == 10 ? 7 : 0, golden.ints.data(), kind, 380, 36, 46, &other), VM_STATUS_OK);
+        EXPECT_EQ(other, nullptr) << "kind " << kind;
+    }
+    // A destroyed model, a profile and any other pointer are unknown handles; destroying them does nothing.
+    void* profile = CreateMathProfile("not a model");
+    int unrelated = 0;
+    const double cmyk[4] = {0, 0, 0, 0};
+    double Lab[3] = {-1, -1, -1};
+    ASSERT_EQ(PredictPrintModel(handle, 1, cmyk, nullptr, nullptr, Lab), VM_STATUS_OK);
+    EXPECT_GT(Lab[0], 90.0);
+    DestroyPrintModel(handle);
+    for (const void* stranger : {handle, profile, static_cast<void*>(&unrelated)}) {
+        const char* name = nullptr;
+        EXPECT_EQ(PredictPrintModel(stranger, 1, cmyk, nullptr, nullptr, Lab), VM_STATUS_UNKNOWN_HANDLE);
+        EXPECT_EQ(DescribePrintModel(stranger, &name, nullptr, nullptr, nullptr), VM_STATUS_UNKNOWN_HANDLE);
+        EXPECT_EQ(GetPrintModelValue(stranger, 0, &name, nullptr, nullptr, nullptr), VM_STATUS_UNKNOWN_HANDLE);
+        EXPECT_EQ(name, nullptr);
+        DestroyPrintModel(const_cast<void*>(stranger));
+    }
+    DestroyMathProfile(profile);
 }
 
 TEST(PrintModelEntryPoints, StatusesAsDocumented)

@@ -38,18 +38,18 @@ TEST(PatchMatching, ShuffledRepeatedAndNearbyPatchesGiveTheGoldenBlock)
         const MeasurementBlock block = blockOf(thrice);
         EXPECT_EQ(block.inputKind, golden.inputKind);
         EXPECT_EQ(block.ints, std::vector<int>(golden.ints.begin(), golden.ints.begin() + 46 * golden.valuesPerPatch));
-        // Magenta 0.04 % off is the patch, 0.06 % off another; the paper again with 0.5: averaged, half away from 0.
+        // Magenta 0.04 % off is the patch, 0.06 % off another; the paper again with 0.901: averaged, half away from 0.
         form.rows[17][2] = "89.96";
         form.rows.push_back(form.rows[17]);
         form.rows.back()[0] = "100";
         form.rows.back()[2] = "89.94";
         form.rows.push_back(form.rows[1]);
         form.rows.back()[0] = "101";
-        std::fill(form.rows.back().begin() + 5, form.rows.back().end(), "0.5");
+        std::fill(form.rows.back().begin() + 5, form.rows.back().end(), "0.901");
         const MeasurementBlock nearby = blockOf(form);
         for (size_t i = 0; i < nearby.ints.size(); ++i) {
             const bool paper = i / static_cast<size_t>(golden.valuesPerPatch) == 1;
-            ASSERT_EQ(nearby.ints[i], paper ? (golden.ints[i] + 501) / 2 : golden.ints[i]) << i;
+            ASSERT_EQ(nearby.ints[i], paper ? (golden.ints[i] + 902) / 2 : golden.ints[i]) << i;
         }
     }
 }

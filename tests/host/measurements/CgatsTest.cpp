@@ -49,6 +49,10 @@ TEST(Cgats, ReadsWhatRealFilesHoldAndNamesTheLineOfEachDefect)
         {"DataBeforeFormat", "CGATS.17\nBEGIN_DATA\n", "line 2: BEGIN_DATA comes before any BEGIN_DATA_FORMAT"},
         {"NulBytes", std::string("CGATS.17\nA\0B\n", 13), "line 2: the file holds NUL bytes"},
         {"NotCgats", "Report of 12 March\nall good\n", "line 0: no BEGIN_DATA_FORMAT line"},
+        // Files taken for measurements by mistake are named for what they are.
+        {"ChartTemplate", "\nBOXES 286\n  F _ _ 22 14\n", "line 2: a chart recognition template (BOXES ...)"},
+        {"Xml", "<?xml version=\"1.0\"?>\n<cc:CxF>\n", "line 1: an XML document (<?xml), not CGATS text"},
+        {"IccProfile", std::string(36, 'x') + "acsp" + std::string("\0\0", 2) + "\n", "line 1: an ICC profile"},
         {"LongToken", "CGATS.17\n" + std::string(5000, '1') + "\n",
          "line 2: '1111111111111111111111111111111111111111...' is not a CGATS keyword"},
     };
