@@ -7,6 +7,7 @@
 // from one paper white to another.
 #include "ChartFile.h"
 #include "MathProfile.h"
+#include "ProfileSteps.h"
 #include "models/PrintModels.h"
 
 #include <cmath>
@@ -105,12 +106,12 @@ std::array<Cmyk, 900> buildChart()
 
 const std::array<std::array<unsigned char, 4>, 900> MathProfile::toBeCalculated = buildChart();
 
-void MathProfile::predictFourColour(PrintProcess process)
+void profilesteps::predictFourColour(MathProfile& profile, PrintProcess process)
 {
     if (process == VM_PROCESS_GRAVURE)
-        calcGravureSampleByOrder(inkOrder);
+        calcGravureSampleByOrder(profile, profile.inkOrder);
     else
-        calcOffsetSample();
+        profile.calcOffsetSample();
 }
 
 void MathProfile::calculateChart(double** rows, PrintProcess process, const char* path)
@@ -120,14 +121,14 @@ void MathProfile::calculateChart(double** rows, PrintProcess process, const char
 
     std::ofstream stream;
     chartfile::open(stream, path);
-    readForm(rows);
+    profilesteps::readForm(*this, rows);
     chartfile::writeXYZHeader(stream, 900);
 
     ColorPatch& sample = patchSlots[kSlotCurrentSample];
     for (size_t i = 0; i < toBeCalculated.size(); ++i) {
         const auto& entry = toBeCalculated[i];
         setSample(entry[0], entry[1], entry[2], entry[3], 0.0, 0.0, 0.0);
-        predictFourColour(process);
+        profilesteps::predictFourColour(*this, process);
         chartfile::limitY(sample.XYZ);
         chartfile::writeXYZLine(stream, static_cast<int>(i) + 1, sample.channel, sample.XYZ);
     }
@@ -141,7 +142,7 @@ void MathProfile::calculateChart46(double** rows, PrintProcess process, const ch
 
     std::ofstream stream;
     chartfile::open(stream, path);
-    readForm(rows);
+    profilesteps::readForm(*this, rows);
     chartfile::writeXYZHeader(stream, 46);
 
     ColorPatch& sample = patchSlots[kSlotCurrentSample];
@@ -152,7 +153,7 @@ void MathProfile::calculateChart46(double** rows, PrintProcess process, const ch
             std::memcpy(sample.spectrum, rows[i], sizeof sample.spectrum);
             spec2XYZ(&sample);
         } else {
-            predictFourColour(process);
+            profilesteps::predictFourColour(*this, process);
         }
         chartfile::limitY(sample.XYZ);
         chartfile::writeXYZLine(stream, i + 1, sample.channel, sample.XYZ);
@@ -211,9 +212,9 @@ void MathProfile::convertChart(double** rows, int count, const char* path, doubl
             std::memcpy(reference.spectrum, rows[patch], sizeof reference.spectrum);
             spec2XYZ(&reference);
             chartfile::limitY(reference.XYZ);
-            white[r] = labOf(reference);
+            white[r] = profilesteps::labOf(*this, reference);
         }
-        w = veltmarquist::chartConversionBlendWeight(deltaE(white[0], white[1]));
+        w = veltmarquist::chartConversionBlendWeight(profilesteps::deltaE(white[0], white[1]));
     }
 
     ColorPatch& sample = patchSlots[kSlotCurrentSample];

@@ -15,6 +15,7 @@
 // were computed that way, so the table and its float steps are kept exactly.
 #include "Colorimetry.h"
 #include "MathProfile.h"
+#include "ProfileSteps.h"
 
 #include <charconv>
 #include <cmath>
@@ -156,12 +157,12 @@ MathProfile::lab MathProfile::XYZ2LAB(xyz value)
     return lab{L[0], L[1], L[2]};
 }
 
-MathProfile::lab MathProfile::labOf(const ColorPatch& patch)
+MathProfile::lab profilesteps::labOf(MathProfile& profile, const ColorPatch& patch)
 {
-    return XYZ2LAB(xyz{patch.XYZ[0] / 100.0, patch.XYZ[1] / 100.0, patch.XYZ[2] / 100.0});
+    return profile.XYZ2LAB(MathProfile::xyz{patch.XYZ[0] / 100.0, patch.XYZ[1] / 100.0, patch.XYZ[2] / 100.0});
 }
 
-double MathProfile::deltaE(const lab& first, const lab& second)
+double profilesteps::deltaE(const lab& first, const lab& second)
 {
     const double dL = first.L - second.L, da = first.a - second.a, db = first.b - second.b;
     return std::sqrt(dL * dL + da * da + db * db);

@@ -13,11 +13,13 @@
 // is greater), so ties go to the candidate met first; best scores start at 10000.
 #include "GrayFitGrid.h"
 #include "MathProfile.h"
+#include "ProfileSteps.h"
 
 #include <cmath>
 #include <cstring>
 
 using namespace grayfit;
+using namespace profilesteps;
 
 namespace {
 
@@ -40,29 +42,29 @@ void setGrayFitFields(MathProfile& profile, const int point[5])
 
 void MathProfile::calculateGrayDiffFactor(double** rows)
 {
-    fitGrayDiffFactor(rows, false);
+    fitGrayDiffFactor(*this, rows, false);
 }
 
 void MathProfile::calculateGrayDiffFactorStraightforward(double** rows)
 {
-    fitGrayDiffFactor(rows, true);
+    fitGrayDiffFactor(*this, rows, true);
 }
 
-double MathProfile::scoreGrayPoint(const lab& grey3, const lab& grey4, const int point[5])
+double profilesteps::scoreGrayPoint(MathProfile& profile, const lab& grey3, const lab& grey4, const int point[5])
 {
-    setGrayFitFields(*this, point);
-    const ColorPatch& sample = patchSlots[kSlotCurrentSample];
-    setSample(40.0, 40.0, 40.0, 0.0, 0.0, 0.0, 0.0);
-    calcOffsetSample();
-    const double dE3 = deltaE(grey3, labOf(sample));
-    setSample(40.0, 40.0, 40.0, 40.0, 0.0, 0.0, 0.0);
-    calcOffsetSample();
-    const double dE4 = deltaE(grey4, labOf(sample));
+    setGrayFitFields(profile, point);
+    const ColorPatch& sample = profile.patchSlots[MathProfile::kSlotCurrentSample];
+    profile.setSample(40.0, 40.0, 40.0, 0.0, 0.0, 0.0, 0.0);
+    profile.calcOffsetSample();
+    const double dE3 = deltaE(grey3, labOf(profile, sample));
+    profile.setSample(40.0, 40.0, 40.0, 40.0, 0.0, 0.0, 0.0);
+    profile.calcOffsetSample();
+    const double dE4 = deltaE(grey4, labOf(profile, sample));
     return std::sqrt(dE3 * dE3 + dE4 * dE4);
 }
 
-void MathProfile::scanGrayGridStraightforward(const lab& grey3, const lab& grey4, int bestPoint[5],
-                                              double& bestScore)
+void profilesteps::scanGrayGridStraightforward(MathProfile& profile, const lab& grey3, const lab& grey4,
+                                               int bestPoint[5], double& bestScore)
 {
     // Limit outermost and black innermost, every point scored in full.
     GrayPoint point;
@@ -74,7 +76,7 @@ void MathProfile::scanGrayGridStraightforward(const lab& grey3, const lab& grey4
                      point.p[kPY] += kYellowAxis.step)
                     for (point.p[kPK] = kBlackAxis.first; point.p[kPK] <= kBlackAxis.last;
                          point.p[kPK] += kBlackAxis.step) {
-                        const double s = scoreGrayPoint(grey3, grey4, point.p);
+                        const double s = scoreGrayPoint(profile, grey3, grey4, point.p);
                         if (bestScore > s) {
                             bestScore = s;
                             std::memcpy(bestPoint, point.p, sizeof point.p);
@@ -82,29 +84,29 @@ void MathProfile::scanGrayGridStraightforward(const lab& grey3, const lab& grey4
                     }
 }
 
-void MathProfile::fitGrayDiffFactor(double** rows, bool straightforward)
+void profilesteps::fitGrayDiffFactor(MathProfile& profile, double** rows, bool straightforward)
 {
-    readForm(rows);
+    readForm(profile, rows);
 
-    auto measuredLab = [this](const double* row) {
+    auto measuredLab = [&profile](const double* row) {
         ColorPatch patch = {};
         std::memcpy(patch.spectrum, row, sizeof patch.spectrum);
-        spec2XYZ(&patch);
-        return labOf(patch);
+        profile.spec2XYZ(&patch);
+        return labOf(profile, patch);
     };
     // Rows 44 and 45 are read after readData, which may have exchanged rows.
     const lab grey3 = measuredLab(rows[44]);
     const lab grey4 = measuredLab(rows[45]);
-    auto score = [&](const GrayPoint& point) { return scoreGrayPoint(grey3, grey4, point.p); };
+    auto score = [&](const GrayPoint& point) { return scoreGrayPoint(profile, grey3, grey4, point.p); };
 
     // Coarse grid. The fast evaluation finds the same best point and score as
     // the point-by-point loop (GrayFitFastPath.cpp tells why); the loop stays
     // as the reference and for a profile that the fast evaluation declines.
     double best = kNoScore;
     GrayPoint current = {{0, 0, 0, 0, 0}};
-    const bool scannedFast = !straightforward && scanGrayGridFast(grey3, grey4, current.p, best);
+    const bool scannedFast = !straightforward && scanGrayGridFast(profile, grey3, grey4, current.p, best);
     if (!scannedFast)
-        scanGrayGridStraightforward(grey3, grey4, current.p, best);
+        scanGrayGridStraightforward(profile, grey3, grey4, current.p, best);
     // Scores start at 10000 and only a smaller one is taken, so the best
     // score is below 10000 exactly when some point scored.
     if (!(best < kNoScore)) {
@@ -115,12 +117,12 @@ void MathProfile::fitGrayDiffFactor(double** rows, bool straightforward)
         }
         // Non-finite measurements: no point scores at all. Keep the
         // uncorrected model rather than a zero coverage limit.
-        for (double& factor : grayDiffFactor)
+        for (double& factor : profile.grayDiffFactor)
             factor = 0.0;
-        coverageLimit = 200.0;
+        profile.coverageLimit = 200.0;
         return;
     }
-    setGrayFitFields(*this, current.p);
+    setGrayFitFields(profile, current.p);
 
     // Fine search: greedy coordinate moves with a shrinking step, every move
     // scored in full. A move is tried only when the value before it is inside
@@ -148,13 +150,13 @@ void MathProfile::fitGrayDiffFactor(double** rows, bool straightforward)
                 }
             }
         } while (best < passStart);
-        setGrayFitFields(*this, current.p);
+        setGrayFitFields(profile, current.p);
     }
 }
 
 void MathProfile::calculateRGBFactors(double** rows)
 {
-    readForm(rows);
+    readForm(*this, rows);
 
     // Red, green and blue two-ink solids and their measured colours.
     const double requests[3][4] = {{0, 100, 100, 0}, {100, 0, 100, 0}, {100, 100, 0, 0}};
@@ -164,7 +166,7 @@ void MathProfile::calculateRGBFactors(double** rows)
         ColorPatch patch = {};
         std::memcpy(patch.spectrum, rows[measuredRow[p]], sizeof patch.spectrum);
         spec2XYZ(&patch);
-        reference[p] = labOf(patch);
+        reference[p] = labOf(*this, patch);
     }
 
     const ColorPatch& sample = patchSlots[kSlotCurrentSample];
@@ -172,8 +174,8 @@ void MathProfile::calculateRGBFactors(double** rows)
     auto differences = [&](int order, double dE[3]) {
         for (int p = 0; p < 3; ++p) {
             setSample(requests[p][0], requests[p][1], requests[p][2], requests[p][3], 0.0, 0.0, 0.0);
-            calcGravureSampleByOrder(order);
-            dE[p] = deltaE(reference[p], labOf(sample));
+            calcGravureSampleByOrder(*this, order);
+            dE[p] = deltaE(reference[p], labOf(*this, sample));
         }
     };
 

@@ -31,6 +31,7 @@
 // contraction into fused multiply-add. Candidates are compared in the order of
 // the straightforward loop, so ties resolve the same way.
 #include "GrayFitFastPath.h"
+#include "ProfileSteps.h"
 #include "models/FourColourKernels.h"
 
 #include <cmath>
@@ -208,8 +209,8 @@ struct GridEvaluator::Tables {
 GridEvaluator::GridEvaluator(MathProfile& profile) : inputs_(new Inputs), tables_(new Tables)
 {
     const MathProfile::ColorPatch& paper = profile.patchSlots[MathProfile::kSlotPaper];
-    const MathProfile::ColorPatch* solid[4] = {&profile.solidOf(0), &profile.solidOf(1), &profile.solidOf(2),
-                                               &profile.solidOf(3)};
+    const MathProfile::ColorPatch* solid[4] = {&profilesteps::solidOf(profile, 0), &profilesteps::solidOf(profile, 1),
+                                               &profilesteps::solidOf(profile, 2), &profilesteps::solidOf(profile, 3)};
     const double requestedBlack[2] = {0.0, 40.0};
     for (int g = 0; g < 2; ++g) {
         profile.setSample(40.0, 40.0, 40.0, requestedBlack[g], 0.0, 0.0, 0.0);
@@ -324,17 +325,19 @@ void GridEvaluator::fourColourSums(int cyan, int magenta, int yellow, LaneSums<k
 
 } // namespace grayfit
 
-bool MathProfile::scanGrayGridFast(const lab& grey3, const lab& grey4, int bestPoint[5], double& bestScore)
+bool profilesteps::scanGrayGridFast(MathProfile& profile, const lab& grey3, const lab& grey4, int bestPoint[5],
+                                    double& bestScore)
 {
     using namespace grayfit;
-    GridEvaluator grid(*this);
+    GridEvaluator grid(profile);
     if (!grid.threeColourGreyIgnoresBlack())
         return false;
 
     // Colour difference from band sums, as spec2XYZ, labOf and deltaE form it.
-    auto difference = [this](const lab& reference, double sumX, double sumY, double sumZ) {
+    const double normFactor = profile.normFactor;
+    auto difference = [&profile, normFactor](const lab& reference, double sumX, double sumY, double sumZ) {
         const double X = sumX * normFactor, Y = sumY * normFactor, Z = sumZ * normFactor;
-        return deltaE(reference, XYZ2LAB(xyz{X / 100.0, Y / 100.0, Z / 100.0}));
+        return deltaE(reference, profile.XYZ2LAB(MathProfile::xyz{X / 100.0, Y / 100.0, Z / 100.0}));
     };
 
     LaneSums<kYellowLanes> sums3;

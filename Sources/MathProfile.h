@@ -16,10 +16,6 @@
 #include <fstream>
 #include <vector>
 
-namespace grayfit {
-class GridEvaluator;
-}
-
 // The library's exception. Code 1: a chart file could not be opened.
 class VELTMARQUIST_API Exceptions {
 public:
@@ -150,40 +146,6 @@ public:
     static const std::array<std::array<unsigned char, 6>, 138> toBeCalculatedCLR6;
     static const std::array<std::array<unsigned char, 7>, 169> toBeCalculatedCLR7;
     static const std::array<std::array<unsigned char, 4>, 3500> ZANExtended;
-
-private:
-    // The gravure model for one ink order, channels i1..i4 of the current sample.
-    void calcGravureSample(int i1, int i2, int i3, int i4);
-    // readData, then the four ink lists ordered: how every four-colour
-    // calculation takes in the test form.
-    void readForm(double** rows);
-    // The model of a four-colour process: 1 gravure in inkOrder, else offset.
-    void predictFourColour(PrintProcess process);
-    // Runs the gravure method that an ink order selects (as inkOrder does).
-    void calcGravureSampleByOrder(int order);
-    // The solid of channel `ink` for the offset model: the last patch of its list.
-    ColorPatch& solidOf(int ink);
-    // CIELAB of a patch's X, Y, Z (divided by 100 first).
-    lab labOf(const ColorPatch& patch);
-    // CIE 1976 colour difference sqrt(dL^2 + da^2 + db^2).
-    static double deltaE(const lab& first, const lab& second);
-    // The grey fit; `straightforward` scores the coarse grid point by point.
-    void fitGrayDiffFactor(double** rows, bool straightforward);
-    // Score of one point (pC, pM, pY, pK, pL) of the grey fit against the
-    // measured greys: sets the fields and predicts both greys.
-    double scoreGrayPoint(const lab& grey3, const lab& grey4, const int point[5]);
-    // The coarse grid of the grey fit, every point through scoreGrayPoint.
-    // Improves on the best point and score passed in (a tie keeps the earlier).
-    void scanGrayGridStraightforward(const lab& grey3, const lab& grey4, int bestPoint[5], double& bestScore);
-    // The same grid scored from cached dot areas, with the black factors as
-    // lanes of one loop: the same best point and score, bit for bit. Returns
-    // false without scoring when the three-colour grey would depend on the
-    // black factor.
-    bool scanGrayGridFast(const lab& grey3, const lab& grey4, int bestPoint[5], double& bestScore);
-
-    // The fast evaluation of the grey fit reads the model's inputs as
-    // calcOffsetSample does.
-    friend class grayfit::GridEvaluator;
 };
 
 #endif // VELTMARQUIST_MATHPROFILE_H

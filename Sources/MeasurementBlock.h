@@ -9,6 +9,10 @@ namespace measurementblock {
 
 const int kRowTableSize = 2000;
 
+// Value of the 36-band position `band` from 16 values at 400, 420, ..., 700 nm
+// (MathProfile::InterpolateSpectralValue).
+double interpolateSixteen(int band, const double* values);
+
 // How the host describes its block (the arguments of CalculateChart).
 struct Layout {
     int inputKind, firstWavelength, valuesPerPatch, count;

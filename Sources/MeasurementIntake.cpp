@@ -7,6 +7,7 @@
 #include "Colorimetry.h"
 #include "FormOrientation.h"
 #include "MathProfile.h"
+#include "ProfileSteps.h"
 
 #include <cstring>
 
@@ -168,11 +169,11 @@ void MathProfile::sortData(std::vector<ColorPatch>& list)
             }
 }
 
-void MathProfile::readForm(double** rows)
+void profilesteps::readForm(MathProfile& profile, double** rows)
 {
-    readData(rows);
+    profile.readData(rows);
     for (int list = 0; list < 4; ++list)
-        sortData(tintLists[list]);
+        profile.sortData(profile.tintLists[list]);
 }
 
 void MathProfile::clearTintLists()

@@ -6,6 +6,7 @@
 // current sample's spectrum and X, Y, Z; the models' formulas are evaluated in
 // models/FourColourKernels.cpp.
 #include "MathProfile.h"
+#include "ProfileSteps.h"
 #include "models/FourColourKernels.h"
 
 #include <cmath>
@@ -45,11 +46,11 @@ double MathProfile::getDotarea(double tint, double solid, double paper)
     return veltmarquist::models::dotArea(tint, solid, paper);
 }
 
-MathProfile::ColorPatch& MathProfile::solidOf(int ink)
+MathProfile::ColorPatch& profilesteps::solidOf(MathProfile& profile, int ink)
 {
     // Without a measured tint of this ink the paper stands in for its solid,
     // so that the ink prints nothing.
-    return tintLists[ink].empty() ? patchSlots[kSlotPaper] : tintLists[ink].back();
+    return profile.tintLists[ink].empty() ? profile.patchSlots[MathProfile::kSlotPaper] : profile.tintLists[ink].back();
 }
 
 void MathProfile::calcOffsetSample()
@@ -63,7 +64,8 @@ void MathProfile::calcOffsetSample()
         exponent[x] = offsetExponent(grayDiffFactor[x], others[x], coverage[x], coverageLimit);
 
     ColorPatch& paper = patchSlots[kSlotPaper];
-    ColorPatch* primary[kOffsetPrimaries] = {&solidOf(0), &solidOf(1), &solidOf(2), &solidOf(3)};
+    ColorPatch* primary[kOffsetPrimaries] = {&profilesteps::solidOf(*this, 0), &profilesteps::solidOf(*this, 1),
+                                             &profilesteps::solidOf(*this, 2), &profilesteps::solidOf(*this, 3)};
     for (int s = 0; s <= 10; ++s)
         primary[4 + s] = &patchSlots[s];
     primary[kPaperPrimary] = &paper;
@@ -85,24 +87,27 @@ void MathProfile::calcOffsetSample()
     spec2XYZ(&sample);
 }
 
-void MathProfile::calcGravureSample(int i1, int i2, int i3, int i4)
+void profilesteps::calcGravureSample(MathProfile& profile, int i1, int i2, int i3, int i4)
 {
-    ColorPatch& sample = patchSlots[kSlotCurrentSample];
+    MathProfile::ColorPatch* slots = profile.patchSlots;
+    ColorPatch& sample = slots[MathProfile::kSlotCurrentSample];
     const double coverage[3] = {sample.channel[i1], sample.channel[i2], sample.channel[i3]};
-    const double* tint[4] = {patchSlots[kSlotFirstTint + i1].spectrum, patchSlots[kSlotFirstTint + i2].spectrum,
-                             patchSlots[kSlotFirstTint + i3].spectrum, patchSlots[kSlotFirstTint + i4].spectrum};
-    veltmarquist::models::gravureSpectrum(patchSlots[kSlotPaper].spectrum, tint, coverage, rgbFactor, sample.spectrum);
-    spec2XYZ(&sample);
+    const int first = MathProfile::kSlotFirstTint;
+    const double* tint[4] = {slots[first + i1].spectrum, slots[first + i2].spectrum, slots[first + i3].spectrum,
+                             slots[first + i4].spectrum};
+    veltmarquist::models::gravureSpectrum(slots[MathProfile::kSlotPaper].spectrum, tint, coverage, profile.rgbFactor,
+                                          sample.spectrum);
+    profile.spec2XYZ(&sample);
 }
 
-void MathProfile::calcGravureSampleKCMY() { calcGravureSampleByOrder(1); }
-void MathProfile::calcGravureSampleYCMK() { calcGravureSampleByOrder(2); }
-void MathProfile::calcGravureSampleYMKC() { calcGravureSampleByOrder(3); }
-void MathProfile::calcGravureSampleYKMC() { calcGravureSampleByOrder(4); }
-void MathProfile::calcGravureSampleCMYK() { calcGravureSampleByOrder(0); }
+void MathProfile::calcGravureSampleKCMY() { profilesteps::calcGravureSampleByOrder(*this, 1); }
+void MathProfile::calcGravureSampleYCMK() { profilesteps::calcGravureSampleByOrder(*this, 2); }
+void MathProfile::calcGravureSampleYMKC() { profilesteps::calcGravureSampleByOrder(*this, 3); }
+void MathProfile::calcGravureSampleYKMC() { profilesteps::calcGravureSampleByOrder(*this, 4); }
+void MathProfile::calcGravureSampleCMYK() { profilesteps::calcGravureSampleByOrder(*this, 0); }
 
-void MathProfile::calcGravureSampleByOrder(int order)
+void profilesteps::calcGravureSampleByOrder(MathProfile& profile, int order)
 {
     const int* ink = veltmarquist::models::gravureInkOrder(order).ink;
-    calcGravureSample(ink[0], ink[1], ink[2], ink[3]);
+    calcGravureSample(profile, ink[0], ink[1], ink[2], ink[3]);
 }

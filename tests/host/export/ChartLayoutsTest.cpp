@@ -49,6 +49,40 @@ TEST(ChartLayouts, GeneratedAndFileLayoutsHaveTheirCountOrderAndIdentifiers)
     }
 }
 
+// Every identifier goes into a chart a profile builder reads back: one no
+// reader may take becomes the patch's number, with a warning naming its line.
+TEST(ChartLayouts, IdentifiersNoReaderMayTakeAreReplacedByThePatchNumber)
+{
+    const struct {
+        const char* what;
+        std::vector<std::string> ids; // as written in the file (quoted)
+        std::vector<std::string> written;
+        size_t warnings;
+    } cases[] = {
+        {"plain and UTF-8 kept", {"A1", "Gr\xC3\xBCn", std::string(64, 'x')}, {"A1", "Gr\xC3\xBCn", std::string(64, 'x')}, 0},
+        {"too long", {"A1", std::string(65, 'x'), "C3"}, {"A1", "2", "C3"}, 1},
+        {"right-to-left override", {"A1", "a\xE2\x80\xAE" "b", "C3"}, {"A1", "2", "C3"}, 1},
+        {"zero width space", {"\xE2\x80\x8B" "A1", "B2", "C3"}, {"1", "B2", "C3"}, 1},
+        {"blank and control", {"A 1", "B\x1b" "2", "C3"}, {"1", "2", "C3"}, 2},
+        {"not UTF-8", {"A1", "B\xE9", "C3"}, {"A1", "2", "C3"}, 1},
+        {"a number taken twice", {"2", "long " + std::string(70, 'y'), "C3"}, {"1", "2", "3"}, 2},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.what);
+        std::string rows;
+        for (size_t patch = 0; patch < c.ids.size(); ++patch)
+            rows += "\"" + c.ids[patch] + "\" " + std::to_string(10 * patch) + " 0 0 0\n";
+        const PatchLayout layout = readLayout(temporaryFile("ids.txt", "CGATS.17\nBEGIN_DATA_FORMAT\nSAMPLE_ID CMYK_C "
+                                                                       "CMYK_M CMYK_Y CMYK_K\nEND_DATA_FORMAT\n"
+                                                                       "BEGIN_DATA\n" + rows + "END_DATA\n"));
+        EXPECT_EQ(layout.ids, c.written);
+        EXPECT_EQ(layout.warnings.size(), c.warnings);
+        for (const std::string& warning : layout.warnings)
+            EXPECT_TRUE(warning.rfind("line ", 0) == 0 || warning.find("every patch is numbered") != std::string::npos)
+                << warning;
+    }
+}
+
 TEST(ChartLayouts, RefusalsNameWhatIsWrongAndWhere)
 {
     const std::string noInks = temporaryFile("rgb.txt", "CGATS.17\nBEGIN_DATA_FORMAT\nSAMPLE_ID RGB_R RGB_G RGB_B\n"

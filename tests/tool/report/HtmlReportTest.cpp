@@ -182,7 +182,10 @@ TEST(HtmlReport, ShowsWhatTheFileSaysEscaped)
     ts::TempDir dir;
     std::string form = ts::readFile(kSamples + "/offset_form.txt");
     const std::string instrument = "<i>Spectro</i> &\t'Co' \x1b[31m";
-    form.insert(form.find('\n') + 1, "INSTRUMENTATION\t\"" + instrument + "\"\n");
+    // Where the measurements came from, with characters that would reorder or hide text.
+    form.insert(form.find('\n') + 1, "INSTRUMENTATION\t\"" + instrument + "\"\nDESCRIPTOR\t\"Press 4 \xE2\x80\xAE"
+                                     "kcab\"\nORIGINATOR\t\"Print\xE2\x80\x8Bshop\"\nCREATED\t\"2026-11-02\"\n"
+                                     "PRINT_CONDITIONS\t\"coated, 60 l/cm\"\n");
     std::ofstream(dir.path("form <&>.txt")) << form;
     const auto [html, text] = report({"", dir.path("form <&>.txt"), 0, false, false, {}}, dir);
     const Page page(html);
@@ -190,6 +193,12 @@ TEST(HtmlReport, ShowsWhatTheFileSaysEscaped)
     EXPECT_EQ(page.string("//h:table[@class='facts']/h:tr[h:td='INSTRUMENTATION']/h:td[2]"),
               "<i>Spectro</i> & 'Co' \\x1b[31m");
     EXPECT_EQ(page.string("//h:table[@class='facts']/h:tr[h:td='File']/h:td[2]"), dir.path("form <&>.txt"));
+    const std::pair<const char*, const char*> provenance[] = {{"DESCRIPTOR", "Press 4 \\u202Ekcab"},
+                                                              {"ORIGINATOR", "Print\\u200Bshop"},
+                                                              {"CREATED", "2026-11-02"},
+                                                              {"PRINT_CONDITIONS", "coated, 60 l/cm"}};
+    for (const auto& [keyword, shown] : provenance)
+        EXPECT_EQ(page.string(std::string("//h:table[@class='facts']/h:tr[h:td='") + keyword + "']/h:td[2]"), shown);
 }
 
 // ---- The command line ---------------------------------------------------------------------------

@@ -7,7 +7,6 @@
 
 #include <algorithm>
 #include <cctype>
-#include <cstdio>
 #include <string>
 
 namespace veltmarquist {
@@ -161,12 +160,17 @@ void renderCompare(const CompareResult& result, std::ostream& out)
     out << "measured 46-step chart written to " << result.measuredWritten << "\n"
         << "modelled 46-step chart (" << kindOf(result.fit->choice) << ") written to " << result.modelWritten << "\n"
         << "patch  C    M    Y    K     dE*ab   dE00\n";
+    // Columns: the text padded to its width, numbers right-aligned, coverages left-aligned.
+    const auto column = [](const std::string& text, size_t width, bool right) {
+        const std::string blanks(text.size() < width ? width - text.size() : 0, ' ');
+        return right ? blanks + text : text + blanks;
+    };
     for (size_t i = 0; i < result.modelled->patches.size(); ++i) {
         const CheckedPatch& patch = result.modelled->patches[i].check;
-        char line[96];
-        std::snprintf(line, sizeof line, "%5zu  %-4g %-4g %-4g %-4g %6.2f %6.2f\n", i + 1, patch.device[0],
-                      patch.device[1], patch.device[2], patch.device[3], patch.deltaEab, patch.deltaE2000);
-        out << line;
+        out << column(std::to_string(i + 1), 5, true) << " ";
+        for (double coverage : patch.device)
+            out << " " << column(number(coverage), 4, false);
+        out << " " << column(fixed(patch.deltaEab), 6, true) << " " << column(fixed(patch.deltaE2000), 6, true) << "\n";
     }
     printSummary("dE*ab    over " + std::to_string(result.deltaEab.count) + " patches:", result.deltaEab, out);
     printSummary("CIEDE2000 over " + std::to_string(result.modelled->deltaE2000.count) + " patches:",
