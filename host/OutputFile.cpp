@@ -317,7 +317,7 @@ void refuseClashingOutputs(const std::vector<std::string>& inputs, const std::ve
     for (const std::string& output : outputs) {
         const std::string unusable = output.empty() ? "" : unusableOutput(output);
         if (!unusable.empty())
-            throw HostError(Failure::OutputUnwritable, unusable);
+            throw HostError(Failure::Usage, unusable);
     }
     std::vector<std::pair<const std::string*, FileIdentity>> seen;
     for (const std::string& output : outputs) {
@@ -377,7 +377,7 @@ PendingOutput::PendingOutput(std::string path) : path_(std::move(path))
 {
     const std::string unusable = unusableOutput(path_);
     if (!unusable.empty())
-        throw HostError(Failure::OutputUnwritable, unusable);
+        throw HostError(Failure::Usage, unusable);
     struct stat status {};
     const bool exists = !isStandardOutput(path_) && ::stat(path_.c_str(), &status) == 0;
     copy_ = isStandardOutput(path_) || (exists && !S_ISREG(status.st_mode));

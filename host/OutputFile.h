@@ -24,9 +24,10 @@ bool isStandardOutput(const std::string& path);
 //   through symbolic links), two outputs on the same file or both on
 //   standard output (Failure::Usage); character devices such as /dev/null
 //   may take several outputs;
-// - an output that no file can be written to (Failure::OutputUnwritable):
-//   a folder, a socket, a block device, or a symbolic link that names no
-//   file (written through, it would create a file where the user did not ask).
+// - an output path that can name no output (Failure::Usage, as a path given
+//   by mistake): a folder, a socket, a block device, or a symbolic link that
+//   names no file (written through, it would create a file where the user
+//   did not ask).
 // Empty paths are outputs the run does not write.
 void refuseClashingOutputs(const std::vector<std::string>& inputs, const std::vector<std::string>& outputs);
 
@@ -48,7 +49,8 @@ void refuseClashingOutputs(const std::vector<std::string>& inputs, const std::ve
 // and the target stays untouched.
 class PendingOutput {
 public:
-    // Failure::OutputUnwritable for an empty path or a target that cannot take a file.
+    // Failure::Usage for an empty path or one that can name no output (as
+    // refuseClashingOutputs), OutputUnwritable when the file cannot be made.
     explicit PendingOutput(std::string path);
     ~PendingOutput();
     PendingOutput(const PendingOutput&) = delete;

@@ -134,7 +134,8 @@ ERRORS = {
                                 ValueError, "reflectance factors lie from 0 to 1"),
     "a blend without whites": (lambda m: convert(np.zeros((1, 4)), "blend", from_white=None),
                                veltmarquist.UsageError, "a blend needs both whites"),
-    "a folder for a chart": (lambda m: m.chart("."), veltmarquist.OutputError, ".: is a folder"),
+    "a folder for a chart": (lambda m: m.chart("."), veltmarquist.UsageError, ".: is a folder"),
+    "an empty path": (lambda m: m.chart(""), veltmarquist.UsageError, "an empty path names no file"),
     "a chart in a missing folder": (lambda m: m.chart("no/chart.txt"), veltmarquist.OutputError,
                                     "no/chart.txt: cannot create a file in no/"),
     "a scale for a file already read": (lambda m: veltmarquist.fit(m.form, scale=1), ValueError,
@@ -203,7 +204,7 @@ def test_outputs_follow_links_and_write_into_devices(offset, tmp_path):
     link = tmp_path / "latest.txt"
     link.symlink_to("charts/chart.txt")
     # A link that names no file is refused: written through, it would make a file nobody asked for.
-    with pytest.raises(veltmarquist.OutputError, match="is a symbolic link to .*, which does not exist"):
+    with pytest.raises(veltmarquist.UsageError, match="is a symbolic link to .*, which does not exist"):
         offset.chart(link)
     (tmp_path / "charts" / "chart.txt").write_text("old")
     offset.chart(link)

@@ -66,7 +66,10 @@ TEST(OutputFile, ClashingOutputsAreRefusedBeforeAnythingIsWritten)
     std::ofstream(form) << "measurements\n";
     fs::create_symlink("form.txt", dir.path("link.txt"));
     fs::create_hard_link(form, dir.path("hard.txt"));
+    fs::create_symlink("missing/chart.txt", dir.path("dangling.txt"));
     const std::tuple<const char*, std::vector<std::string>, bool> cases[] = {
+        {"a folder", {dir.dir()}, true},
+        {"a dangling symbolic link", {dir.path("dangling.txt")}, true},
         {"output through a symlink to the input", {dir.path("link.txt")}, true},
         {"output a hard link of the input", {dir.path("hard.txt")}, true},
         {"two new outputs on one path", {dir.path("a.txt"), dir.dir() + "/./a.txt"}, true},
@@ -83,6 +86,9 @@ TEST(OutputFile, ClashingOutputsAreRefusedBeforeAnythingIsWritten)
         }
         EXPECT_EQ(failure, refused ? Failure::Usage : Failure::Internal) << name;
     }
+    for (const std::string& output : {std::string(), dir.dir(), dir.path("dangling.txt")})
+        EXPECT_THROW(PendingOutput{output}, HostError) << "'" << output << "'";
+    EXPECT_FALSE(fs::exists(dir.path("missing"))) << "written through a dangling link";
 }
 
 TEST(OutputFile, ChartsWithNonFiniteOrMissingDataNeverReplaceTheTarget)
