@@ -37,7 +37,7 @@ void printForm(const FoundForm& form, std::ostream& out)
         << "\n  46 test-form patches found in " << form.picked.setsUsed << " measurements";
     if (form.picked.averaged > 0)
         out << " (repeated measurements averaged for " << form.picked.averaged << " of them)";
-    out << "; " << form.picked.setsIgnored << " other measurements ignored\n";
+    out << "; " << form.picked.setsIgnored << " other measurements, not on the form\n";
 }
 
 std::string inks(const std::vector<double>& numbers, int decimals)
