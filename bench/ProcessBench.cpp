@@ -4,6 +4,8 @@
 // of the two process-0 variants is printed, both measured in the same run.
 #include "TestSupport.h"
 
+#include "RatioReporter.h"
+
 #include <benchmark/benchmark.h>
 
 #include <cstdio>
@@ -116,34 +118,6 @@ void ChartConversion(benchmark::State& state)
     timeFreshProfileCalls(state, static_cast<int>(state.range(0)), readGoldenInput("conversion.in"), "conversion");
 }
 BENCHMARK(ChartConversion)->DenseRange(7, 9)->Unit(benchmark::kMicrosecond);
-
-// Console output as usual, plus the times of every benchmark by name: of its
-// run, or the median of its repetitions when there are several.
-class RatioReporter : public benchmark::ConsoleReporter {
-public:
-    explicit RatioReporter(OutputOptions options) : ConsoleReporter(options) {}
-
-    void ReportRuns(const std::vector<Run>& runs) override
-    {
-        for (const Run& run : runs) {
-            const bool single = run.run_type == Run::RT_Iteration && run.repetitions <= 1;
-            const bool median = run.run_type == Run::RT_Aggregate && run.aggregate_name == "median";
-            if ((single || median) && !run.error_occurred)
-                times_[run.run_name.function_name] = {run.GetAdjustedRealTime(), run.GetAdjustedCPUTime()};
-        }
-        ConsoleReporter::ReportRuns(runs);
-    }
-    void printRatio(const std::string& slow, const std::string& fast) const
-    {
-        const auto s = times_.find(slow), f = times_.find(fast);
-        if (s != times_.end() && f != times_.end() && f->second.first > 0.0 && f->second.second > 0.0)
-            std::printf("%s / %s: %.1f x real time, %.1f x CPU time\n", slow.c_str(), fast.c_str(),
-                        s->second.first / f->second.first, s->second.second / f->second.second);
-    }
-
-private:
-    std::map<std::string, std::pair<double, double>> times_; // real, CPU
-};
 
 } // namespace
 

@@ -439,8 +439,13 @@ std::string PendingOutput::name() const
 void PendingOutput::write(const std::string& text)
 {
     refuseNonFiniteData(text, name());
+    writeBytes(text);
+}
+
+void PendingOutput::writeBytes(const std::string& bytes)
+{
     std::ofstream out(temporary_, std::ios::binary | std::ios::trunc);
-    out << text;
+    out << bytes;
     out.close();
     if (!out)
         throw HostError(Failure::OutputUnwritable, name() + ": write failed (disk full?)");

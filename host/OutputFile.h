@@ -64,6 +64,8 @@ public:
     // Writes `text` to the temporary file (the tool's own files); refuses a
     // text whose data holds a non-finite number.
     void write(const std::string& text);
+    // Writes a binary file (an ICC profile) to the temporary file as it is.
+    void writeBytes(const std::string& bytes);
     // Checks the library's chart in the temporary file: it ends with
     // "END_DATA" and a newline (the library does not see write errors such
     // as a full disk, so they surface here), and every value of its data is

@@ -7,7 +7,7 @@ packages=(build-essential cmake ninja-build pkg-config
           libgtest-dev libgmock-dev libbenchmark-dev
           liblcms2-dev libcli11-dev
           argyll-ref icc-profiles-free  # real CGATS files the reader tests read
-          argyll  # colprof, profcheck, xicclu, spec2cie: profiles from the export (stage 60-profile)
+          argyll bc  # colprof, profcheck, xicclu, iccdump, spec2cie: profiles checked (stage 60-profile)
           libxml2-dev  # the HTML report's test parses the page as XML
           chromium  # renders the HTML report headless (stage 70-report)
           clang libclang-rt-14-dev valgrind python3

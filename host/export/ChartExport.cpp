@@ -31,8 +31,19 @@ const std::set<std::string> kStandardKeywords = {
 // computed from spectra under D50 and the 2 degree observer, and the header
 // says so itself.
 const char* const kMeasurementConditions[] = {
-    "INSTRUMENTATION", "TARGET_INSTRUMENT", "MEASUREMENT_SOURCE", "MEASUREMENT_CONDITION", "FILTER",
+    "INSTRUMENTATION", "MEASUREMENT_SOURCE", "MEASUREMENT_CONDITION", "FILTER",
     "POLARIZATION", "MEASUREMENT_GEOMETRY", "SAMPLE_BACKING", "PRINT_CONDITIONS"};
+
+// The instrument names profile builders know, as the form may write them
+// (any case, blanks ignored), and the name to write.
+const std::pair<const char*, const char*> kInstruments[] = {
+    {"i1pro3", "X-Rite i1 Pro 3"}, {"i1pro2", "X-Rite i1 Pro 2"}, {"i1pro", "X-Rite i1 Pro"},
+    {"spectrolino", "GretagMacbeth Spectrolino"}};
+
+// The instrument the form was measured with, for the builder's compensation
+// of optical brighteners: the form's TARGET_INSTRUMENT, else an instrument
+// its INSTRUMENTATION names, else kDefaultInstrument.
+std::string targetInstrument(const FormProvenance& form);
 
 constexpr int kFirstNm = 380, kStepNm = 10;
 
@@ -100,6 +111,8 @@ void addHeader(KeywordList& header, const PrintModel& model, const FormProvenanc
     }
     if (options.inkLimit)
         header.add("TOTAL_INK_LIMIT", roundTripText(*options.inkLimit));
+    if (options.blackLimit)
+        header.add("BLACK_INK_LIMIT", roundTripText(*options.blackLimit));
     if (options.spectral && options.format == ChartFormat::cti3) {
         header.add("SPECTRAL_BANDS", std::to_string(kSpectrumBands));
         header.add("SPECTRAL_START_NM", std::to_string(kFirstNm));
@@ -107,6 +120,7 @@ void addHeader(KeywordList& header, const PrintModel& model, const FormProvenanc
         // Profile builders read CTI3 spectra in percent whatever the norm says.
         header.add("SPECTRAL_NORM", "100");
     }
+    header.add("TARGET_INSTRUMENT", targetInstrument(form));
     for (const char* name : kMeasurementConditions)
         if (const std::string* value = formKeyword(form, name))
             header.add(name, writable(*value));
@@ -118,6 +132,23 @@ void addHeader(KeywordList& header, const PrintModel& model, const FormProvenanc
     const std::vector<FittedValue>& values = model.fittedValues();
     for (std::size_t i = 0; i < values.size(); ++i)
         header.add("FITTED_VALUE_" + std::to_string(i + 1), fittedValueText(values[i]));
+}
+
+std::string targetInstrument(const FormProvenance& form)
+{
+    if (const std::string* given = formKeyword(form, "TARGET_INSTRUMENT"))
+        if (!given->empty())
+            return writable(*given);
+    if (const std::string* instrumentation = formKeyword(form, "INSTRUMENTATION")) {
+        std::string squeezed;
+        for (char c : *instrumentation)
+            if (c != ' ' && c != '-')
+                squeezed += static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+        for (const auto& [key, name] : kInstruments)
+            if (squeezed.find(key) != std::string::npos)
+                return name;
+    }
+    return kDefaultInstrument;
 }
 
 std::vector<std::string> fieldsOf(const ExportOptions& options)
@@ -200,9 +231,12 @@ std::string createdNow()
 
 void checkOptions(const ExportOptions& options)
 {
-    if (options.format == ChartFormat::library && (options.spectral || options.inkLimit))
-        throw HostError(Failure::Usage, std::string(options.spectral ? "spectra" : "an ink limit") +
+    if (options.format == ChartFormat::library && (options.spectral || options.inkLimit || options.blackLimit))
+        throw HostError(Failure::Usage, std::string(options.spectral ? "spectra" : "ink limits") +
                                             " need a chart for profile builders: format cti3 or cgats, not library");
+    if (options.blackLimit && !(*options.blackLimit >= 0.0 && *options.blackLimit <= 100.0))
+        throw HostError(Failure::Usage, "the black ink limit is a percentage from 0 to 100, not " +
+                                            roundTripText(*options.blackLimit));
     if (options.inkLimit && !(*options.inkLimit >= kMinInkLimit && *options.inkLimit <= kMaxInkLimit))
         throw HostError(Failure::Usage, "the total ink limit is a percentage from 100 (one solid) to 400 (four), not " +
                                             roundTripText(*options.inkLimit));

@@ -44,6 +44,7 @@ struct ExportOptions {
     ChartFormat format = ChartFormat::cti3;
     bool spectral = false;         // also write the 36 predicted bands, 380-730 nm
     std::optional<double> inkLimit; // TOTAL_INK_LIMIT in percent (kMinInkLimit..kMaxInkLimit); never guessed
+    std::optional<double> blackLimit; // BLACK_INK_LIMIT in percent (0..100); never guessed
     std::string created;           // the CREATED value; empty: createdNow()
 };
 
@@ -55,8 +56,14 @@ std::string createdNow();
 // The total ink limits a press can have: from one solid to four.
 constexpr double kMinInkLimit = 100.0, kMaxInkLimit = 400.0;
 
-// Refuses options that do not go together (Failure::Usage): spectra or an
-// ink limit with the library format, an ink limit outside 100..400 %.
+// The TARGET_INSTRUMENT of a chart whose form names no instrument a profile
+// builder knows: a common spectrophotometer of print shops, so that the
+// builder's compensation of optical brighteners (colprof -f) can run.
+constexpr const char* kDefaultInstrument = "X-Rite i1 Pro 2";
+
+// Refuses options that do not go together (Failure::Usage): spectra or ink
+// limits with the library format, an ink limit outside 100..400 %, a black
+// limit outside 0..100 %.
 void checkOptions(const ExportOptions& options);
 
 // The chart of `layout` predicted by `model`, as CGATS text (LF line ends).

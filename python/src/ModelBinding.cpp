@@ -7,6 +7,7 @@
 #include "Failure.h"
 #include "FourColourForm.h"
 #include "OutputFile.h"
+#include "PrintProfile.h"
 
 #include <pybind11/stl.h>
 
@@ -130,13 +131,14 @@ py::tuple predict(const Model& model, const py::object& cmyk)
 
 std::size_t writeChart(const Model& model, const py::object& pathGiven, const py::object& layoutGiven,
                        const py::object& format, const py::object& spectral, const py::object& inkLimit,
-                       const py::object& created)
+                       const py::object& blackLimit, const py::object& created)
 {
     const std::string path = pathOf(pathGiven, "path"), layoutName = pathOf(layoutGiven, "layout");
     exporting::ExportOptions options;
     options.format = exporting::chartFormatNamed(textOf(format, "format"));
     options.spectral = flagOf(spectral, "spectral");
     options.inkLimit = numberOf(inkLimit, "ink_limit");
+    options.blackLimit = numberOf(blackLimit, "black_limit");
     options.created = created.is_none() ? "" : textOf(created, "created");
     py::gil_scoped_release released;
     exporting::checkOptions(options);
@@ -148,6 +150,58 @@ std::size_t writeChart(const Model& model, const py::object& pathGiven, const py
                                         layout, options));
     output.commit();
     return layout.size();
+}
+
+py::object writeProfile(const Model& model, const py::object& pathGiven, const py::object& inkLimit,
+                        const py::object& blackLimit, const py::object& black, const py::object& blackStart,
+                        const py::object& blackAmount, const py::object& blackShape, const py::object& blackFixed,
+                        const py::object& grid, const py::object& b2aGrid, const py::object& iccVersion,
+                        const py::object& description, const py::object& copyright)
+{
+    const py::object result = py::module_::import("veltmarquist._results").attr("Profile");
+    const std::string path = pathOf(pathGiven, "path");
+    profile::ProfileOptions options;
+    options.inkLimit = *numberOf(inkLimit, "ink_limit", false);
+    options.blackLimit = *numberOf(blackLimit, "black_limit", false);
+    const std::string preset = textOf(black, "black");
+    const std::optional<profile::BlackGeneration> named = profile::blackGenerationNamed(preset);
+    if (!named)
+        throw HostError(Failure::Usage, "unknown black generation '" + preset + "'; presets: " +
+                                            profile::blackGenerationNames());
+    options.black = *named;
+    const std::optional<double> start = numberOf(blackStart, "black_start"), amount = numberOf(blackAmount, "black_amount"),
+                                shape = numberOf(blackShape, "black_shape");
+    if (start || amount || shape)
+        options.black.name = "custom, from " + preset;
+    options.black.start = start.value_or(options.black.start);
+    options.black.amount = amount.value_or(options.black.amount);
+    options.black.shape = shape.value_or(options.black.shape);
+    options.black.fixed = options.black.fixed || flagOf(blackFixed, "black_fixed");
+    const auto whole = [](const py::object& given, const char* what) -> std::optional<int> {
+        if (given.is_none())
+            return std::nullopt;
+        if (!py::isinstance<py::int_>(given) || py::isinstance<py::bool_>(given))
+            throw py::type_error(std::string(what) + " must be an int");
+        return given.cast<int>();
+    };
+    options.a2bNodes = whole(grid, "grid");
+    options.b2aNodes = *whole(b2aGrid, "b2a_grid");
+    const std::optional<int> version = whole(iccVersion, "icc_version");
+    if (*version != 2 && *version != 4)
+        throw HostError(Failure::Usage, "icc_version " + std::to_string(*version) + ": 2 (2.4) or 4 (4.3)");
+    options.version = *version == 4 ? profile::IccVersion::v4 : profile::IccVersion::v2;
+    options.description = description.is_none() ? "" : textOf(description, "description");
+    options.copyright = copyright.is_none() ? "" : textOf(copyright, "copyright");
+    profile::ProfileSummary summary;
+    {
+        py::gil_scoped_release released;
+        refuseClashingOutputs({model.found->path}, {path});
+        PendingOutput output(path);
+        output.writeBytes(profile::printProfile(model.fit, *model.found, options, summary));
+        output.commit();
+    }
+    return result(text(summary.description), vector(summary.a2bLevels), summary.b2aNodes, summary.b2aCount,
+                  summary.outOfGamut, summary.darkestL, summary.bytes);
 }
 
 } // namespace
@@ -192,7 +246,8 @@ CoverageScaleWarning and predicts them as the percentages given (0.4 is a
 0.4 % tint). Turn the warning into an error with
 warnings.simplefilter("error", veltmarquist.CoverageScaleWarning).)")
         .def("chart", &writeChart, py::arg("path"), py::arg("layout") = "chart", py::arg("format") = "library",
-             py::arg("spectral") = false, py::arg("ink_limit") = py::none(), py::arg("created") = py::none(),
+             py::arg("spectral") = false, py::arg("ink_limit") = py::none(), py::arg("black_limit") = py::none(),
+             py::arg("created") = py::none(),
              R"(
 Writes a chart as the tool's chart command writes it, byte for byte, and
 atomically (a temporary file beside it, renamed when complete).
@@ -200,9 +255,26 @@ atomically (a temporary file beside it, renamed when complete).
 layout: 'chart' (the library's 900 patches), 'grid', 'grid:N' or the path of
 a CGATS file whose C, M, Y, K to predict. format: 'library', 'cti3' or
 'cgats'. spectral adds the 36 bands and ink_limit writes TOTAL_INK_LIMIT
-(cti3 and cgats; 100 to 400 %). created replaces the CREATED time (else the
+(cti3 and cgats; 100 to 400 %), black_limit BLACK_INK_LIMIT (0 to 100 %);
+the file names TARGET_INSTRUMENT for the builder. created replaces the CREATED time (else the
 clock, or SOURCE_DATE_EPOCH). Returns the number of patches written. The
 form's own file and the layout file are never written over (UsageError).)")
+        .def("profile", &writeProfile, py::arg("path"), py::kw_only(), py::arg("ink_limit") = 300.0,
+             py::arg("black_limit") = 95.0, py::arg("black") = "heavy", py::arg("black_start") = py::none(),
+             py::arg("black_amount") = py::none(), py::arg("black_shape") = py::none(), py::arg("black_fixed") = false,
+             py::arg("grid") = py::none(), py::arg("b2a_grid") = 33, py::arg("icc_version") = 2,
+             py::arg("description") = py::none(), py::arg("copyright") = py::none(), R"(
+Writes an ICC output profile of the press, as the tool's profile command
+writes it, byte for byte, and atomically.
+
+A2B0-2 from this model on a grid of `grid` nodes per ink (17; the offset and
+gravure models: the form's 9 levels), B2A0-2 inverted from that table within
+ink_limit (total, percent) and black_limit (K, percent), with the black
+generation `black` ('none', 'light', 'medium', 'heavy', 'maximum', 'ucr'),
+adjusted by black_start, black_amount (0-1) and black_shape, and held fixed
+on its curve with black_fixed=True; b2a_grid nodes per Lab axis (odd).
+icc_version 2 writes version 2.4, 4 version 4.3. Returns Profile(description,
+a2b_levels, b2a_nodes, b2a_count, out_of_gamut, darkest_lightness, bytes).)")
         .def("check", &checkModel, py::arg("measurements") = py::none(), R"(
 Checks the model against every combination a file measured beyond the test
 form that the model predicts (by default the form's own file), as the tool's

@@ -128,3 +128,24 @@ def test_accuracy_on_the_real_data_set(model):
     check = veltmarquist.fit(REAL_DATA, model=model).check()
     for summary, expected in zip((check.summary, check.chart_summary), REAL_ACCURACY[model]):
         assert (summary.count, *(round(value, 2) for value in (summary.mean, summary.p95, summary.max))) == expected
+
+
+# name: (form, fit() arguments, profile() arguments, the tool's options)
+PROFILES = {
+    "ynsn, defaults": ("offset_press_sheet.txt", {"model": "ynsn"}, {}, []),
+    "offset, version 4, medium black": ("offset_form.txt", {}, {"icc_version": 4, "black": "medium", "b2a_grid": 17},
+                                        ["--model", "offset", "--icc-version", "4", "--black", "medium",
+                                         "--b2a-grid", "17"]),
+}
+
+
+@pytest.mark.parametrize("form, fitting, profiling, options", PROFILES.values(), ids=PROFILES.keys())
+def test_profiles_equal_the_tools(tool, tmp_path, monkeypatch, form, fitting, profiling, options):
+    monkeypatch.setenv("SOURCE_DATE_EPOCH", "1700000000")
+    written = veltmarquist.fit(SAMPLES / form, **fitting).profile(tmp_path / "python.icc", **profiling)
+    subprocess.run([tool, "profile", str(SAMPLES / form), "-o", str(tmp_path / "tool.icc"), "-q", *options],
+                   check=True, env={"SOURCE_DATE_EPOCH": "1700000000"})
+    assert (tmp_path / "python.icc").read_bytes() == (tmp_path / "tool.icc").read_bytes()
+    assert written.bytes == (tmp_path / "python.icc").stat().st_size
+    assert written.b2a_count == written.b2a_nodes ** 3 and 0 < written.out_of_gamut < written.b2a_count
+    assert len(written.a2b_levels) == (9 if fitting.get("model") is None else 17)

@@ -17,7 +17,7 @@ raise the tool's one-line messages (see ``veltmarquist.Error`` and its subclasse
 from ._errors import (CalculationError, ContentError, CoverageScaleWarning, DuplicatePatchError, Error,
                       FileFormatError, MissingFileError, MissingPatchError, OutputError, UnreadableFileError,
                       UsageError)
-from ._results import Conversion, Prediction
+from ._results import Conversion, Prediction, Profile
 from ._veltmarquist import (CheckResult, Measurements, Model, MultiChannelChart, Summary, chart_xyz,
                             convert_chart, delta_e_2000, delta_e_ab, fit, multichannel_chart,
                             read_measurements, spectra_to_xyz, xyz_to_lab)
@@ -27,7 +27,7 @@ __version__ = "1.0.0"
 __all__ = [
     "CalculationError", "CheckResult", "ContentError", "Conversion", "CoverageScaleWarning", "DuplicatePatchError",
     "Error", "FileFormatError", "Measurements", "MissingFileError", "MissingPatchError", "Model",
-    "MultiChannelChart", "OutputError", "Prediction", "Summary", "UnreadableFileError", "UsageError",
+    "MultiChannelChart", "OutputError", "Prediction", "Profile", "Summary", "UnreadableFileError", "UsageError",
     "chart_xyz", "convert_chart", "delta_e_2000", "delta_e_ab", "fit", "multichannel_chart",
     "read_measurements", "spectra_to_xyz", "xyz_to_lab",
 ]

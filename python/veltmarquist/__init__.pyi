@@ -35,6 +35,15 @@ class Conversion(NamedTuple):
     whites_apart: float
     blend_weight: float
 
+class Profile(NamedTuple):
+    description: str
+    a2b_levels: _Array
+    b2a_nodes: int
+    b2a_count: int
+    out_of_gamut: int
+    darkest_lightness: float
+    bytes: int
+
 class Measurements:
     @property
     def path(self) -> str: ...
@@ -112,7 +121,13 @@ class Model:
     def levels(self) -> Optional[_Array]: ...
     def predict(self, cmyk: ArrayLike) -> Prediction: ...
     def chart(self, path: _Path, layout: _Path = "chart", format: str = "library", spectral: bool = False,
-              ink_limit: Optional[float] = None, created: Optional[str] = None) -> int: ...
+              ink_limit: Optional[float] = None, black_limit: Optional[float] = None,
+              created: Optional[str] = None) -> int: ...
+    def profile(self, path: _Path, *, ink_limit: float = 300.0, black_limit: float = 95.0, black: str = "heavy",
+                black_start: Optional[float] = None, black_amount: Optional[float] = None,
+                black_shape: Optional[float] = None, black_fixed: bool = False, grid: Optional[int] = None,
+                b2a_grid: int = 33, icc_version: int = 2, description: Optional[str] = None,
+                copyright: Optional[str] = None) -> Profile: ...
     def check(self, measurements: Union[Measurements, _Path, None] = None) -> CheckResult: ...
     def __getattr__(self, name: str) -> Any: ...  # the fitted values, and warnings
 

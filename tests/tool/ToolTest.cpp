@@ -119,6 +119,14 @@ TEST(CommandLine, EveryCommandEqualsTheLibrarysCharts)
     EXPECT_THAT(run.out, HasSubstr("\n    2  0    0    0    0      0.00   0.00\n"));
     EXPECT_THAT(run.out, HasSubstr("CIEDE2000 over 46 patches: mean "));
     EXPECT_EQ(files(dir.dir()), 4) << "only the form and the three charts";
+    // An ICC profile of the form: its header, and the report of what it holds.
+    const ToolRun profiled = runTool({"profile", "form.txt", "-o", "press.icc", "--b2a-grid", "17", "--grid", "9"},
+                                     dir.dir());
+    EXPECT_EQ(profiled.exitCode, 0) << profiled.err;
+    EXPECT_THAT(profiled.out, HasSubstr("profile: ICC 2.4 output profile '"));
+    EXPECT_THAT(profiled.out, HasSubstr("ink limit 300 %, black limit 95 %, black generation heavy"));
+    EXPECT_EQ(ts::readFile(dir.path("press.icc")).substr(36, 4), "acsp");
+    std::filesystem::remove(dir.path("press.icc"));
     // The multi-channel run's outputs land where they are told (its rules: tests/host/MultiChannelRunTest).
     std::vector<bool> exact;
     std::ofstream(dir.path("form.txt")) << multiChannelForm(7);
@@ -176,7 +184,7 @@ TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
         // The chart's temporary file exists when the second output fails.
         {{"multichannel", "form7.txt", "--inks", "7", "-o", "keep.txt", "--combinations", "no-folder/c.txt"}, 8,
          "no-folder/c.txt: cannot create a file in no-folder/"},
-        {{"chrat", "form7.txt"}, 2, "unknown command 'chrat'; commands: chart, report, compare, multichannel, convert"},
+        {{"chrat", "form7.txt"}, 2, "unknown command 'chrat'; commands: profile, chart, report, compare, multichannel, convert"},
         {{"--frob", "chart"}, 2, "'--frob' is not a command or --help or --version; give the command first"},
         // An empty or unusable output, or an option value no press has, is refused before anything is read.
         {{"chart", "twice.txt", "-o", ""}, 2, "--output: an empty path names no file"},
@@ -190,6 +198,9 @@ TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
         {{"chart", "twice.txt", "-o", "keep.txt", "--model", "ynsn", "--process", "gravure"}, 2,
          "--process gravure contradicts --model ynsn"},
         {{"compare", "twice.txt", "-o", "-"}, 2, "standard output (-) cannot hold two files"},
+        {{"profile", "twice.txt", "-o", "x.icc", "--b2a-grid", "32"}, 2, "B2A grid 32: a B2A table has an odd number"},
+        {{"profile", "short.txt", "-o", "x.icc", "--black", "ripe"}, 2, "--black: ripe not in"},
+        {{"profile", "dark.txt", "-o", "x.icc", "--ink-limit", "450"}, 2, "'450' is not a total ink limit"},
         {{"chart", "twice.txt", "-o", "."}, 2, ".: is a folder; give a file name"},
         {{"chart", "keep.txt", "-o", "./keep.txt"}, 2, "./keep.txt: is the same file as the input keep.txt"},
         // Control characters from a path or a file are shown escaped.

@@ -93,8 +93,8 @@ int main(int argc, char** argv)
     app.set_version_flag("--version", versionText());
     app.require_subcommand(1);
     app.footer(kExitCodes);
-    const Command commands[] = {setupChartCommand(app), setupReportCommand(app), setupCompareCommand(app),
-                                setupMultiChannelCommand(app), setupConvertCommand(app)};
+    const Command commands[] = {setupProfileCommand(app),      setupChartCommand(app),   setupReportCommand(app),
+                                setupCompareCommand(app),      setupMultiChannelCommand(app), setupConvertCommand(app)};
 
     // A closed pipe shows as EPIPE where the tool writes: the report stops
     // quietly, a chart on standard output ends the run quietly.

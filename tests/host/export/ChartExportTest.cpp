@@ -18,9 +18,10 @@ using namespace veltmarquist::exporting;
 
 namespace {
 
-ExportOptions optionsOf(ChartFormat format, bool spectral, std::optional<double> inkLimit = std::nullopt)
+ExportOptions optionsOf(ChartFormat format, bool spectral, std::optional<double> inkLimit = std::nullopt,
+                        std::optional<double> blackLimit = std::nullopt)
 {
-    return {format, spectral, inkLimit, "2025-01-15T12:00:00Z"};
+    return {format, spectral, inkLimit, blackLimit, "2025-01-15T12:00:00Z"};
 }
 
 std::string exported(const PatchLayout& layout, const ExportOptions& options)
@@ -86,7 +87,7 @@ TEST(ChartExport, HeaderAndFieldsOfEachFormatAsOurReaderAndLittleCmsReadThem)
         const char *sheetType, *lastField, *deviceClass, *inkLimit, *spectralNorm;
     } cases[] = {
         {optionsOf(ChartFormat::cti3, false), "CTI3", "LAB_B", "OUTPUT", nullptr, nullptr},
-        {optionsOf(ChartFormat::cti3, true, 300), "CTI3", "SPEC_730", "OUTPUT", "300", "100"},
+        {optionsOf(ChartFormat::cti3, true, 300, 95), "CTI3", "SPEC_730", "OUTPUT", "300", "100"},
         {optionsOf(ChartFormat::cgats, true, 312.5), "CGATS.17", "SPECTRAL_NM730", nullptr, "312.5", nullptr},
     };
     const PatchLayout layout = readLayout("chart");
@@ -106,6 +107,9 @@ TEST(ChartExport, HeaderAndFieldsOfEachFormatAsOurReaderAndLittleCmsReadThem)
         EXPECT_STREQ(keyword("TOTAL_INK_LIMIT"), c.inkLimit);
         EXPECT_STREQ(keyword("SPECTRAL_NORM"), c.spectralNorm);
         EXPECT_STREQ(keyword("INSTRUMENTATION"), "Synthetic: model of ink films on paper, no instrument");
+        // The form names no instrument a profile builder knows: the default one, for its brightener compensation.
+        EXPECT_STREQ(keyword("TARGET_INSTRUMENT"), kDefaultInstrument);
+        EXPECT_STREQ(keyword("BLACK_INK_LIMIT"), c.options.blackLimit ? "95" : nullptr);
         EXPECT_STREQ(keyword("PREDICTED_FROM"), "the 46-patch test form offset_form.txt, by the Yule-Nielsen model");
         EXPECT_EQ(std::string(keyword("FITTED_VALUE_1")).rfind("Yule-Nielsen n (380-730 nm): ", 0), 0u);
         EXPECT_EQ(readMeasurementText(text).file->sets.size(), 900u);
@@ -116,5 +120,21 @@ TEST(ChartExport, HeaderAndFieldsOfEachFormatAsOurReaderAndLittleCmsReadThem)
         EXPECT_EQ(cmsIT8GetDataDbl(it8, "900", "CMYK_K"), 10); // the chart's last patch is K 10
         EXPECT_EQ(cmsIT8GetPropertyDbl(it8, "TOTAL_INK_LIMIT"), c.options.inkLimit.value_or(0));
         cmsIT8Free(it8);
+    }
+}
+
+TEST(ChartExport, TheTargetInstrumentIsTheFormsOrOneItsInstrumentationNames)
+{
+    const PatchLayout layout = readLayout("grid:2");
+    const std::pair<std::vector<std::pair<std::string, std::string>>, const char*> cases[] = {
+        {{{"TARGET_INSTRUMENT", "GretagMacbeth Spectrolino"}}, "GretagMacbeth Spectrolino"},
+        {{{"INSTRUMENTATION", "X-Rite i1Pro 3, M1, white backing"}}, "X-Rite i1 Pro 3"},
+        {{{"INSTRUMENTATION", "i1 Pro2 (M2)"}}, "X-Rite i1 Pro 2"},
+        {{{"INSTRUMENTATION", "D50, 2 degree, 45/0"}}, kDefaultInstrument},
+    };
+    for (const auto& [keywords, instrument] : cases) {
+        const std::string text = exportChart(anyCoverageModel(), FormProvenance{"form.txt", keywords}, layout,
+                                             optionsOf(ChartFormat::cti3, false));
+        EXPECT_STREQ(cgats::readTable(text).first.header.find("TARGET_INSTRUMENT")->value.c_str(), instrument);
     }
 }

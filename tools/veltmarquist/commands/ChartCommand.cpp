@@ -29,6 +29,7 @@ void runChart(const ChartJob& job, ChartResult& result)
     options.format = exporting::chartFormatNamed(job.format);
     options.spectral = job.spectral;
     options.inkLimit = job.inkLimit;
+    options.blackLimit = job.blackLimit;
     exporting::checkOptions(options);
 
     result.form = readTestForm(job.form, job.read, result.formWarnings);
@@ -94,6 +95,9 @@ Command setupChartCommand(CLI::App& app)
     addInkLimit(*command, job.inkLimit,
                 "write TOTAL_INK_LIMIT PERCENT (100 to 400) for the profile builder's separations (cti3, cgats); "
                 "removes no patch");
+    command->add_option("--black-limit", job.blackLimit,
+                        "write BLACK_INK_LIMIT PERCENT (0 to 100) for the profile builder (cti3, cgats)")
+        ->check(CLI::Range(0.0, 100.0));
     command->add_option("--report", job.report,
                         "also write the HTML report of the form, the fit and the check (as the report command)")
         ->check(kPath);

@@ -42,7 +42,9 @@ void ModelOption::add(CLI::App& command)
 ModelChoice ModelOption::choice() const
 {
     const bool processGiven = processOption_->count() > 0;
-    const bool modelGiven = modelOption_->count() > 0 && model_ != "library";
+    // Without --model, --process or --fit-gravure choose among the library's models; with none of
+    // them the command's own default holds.
+    const bool modelGiven = model_ != "library" && (modelOption_->count() > 0 || (!processGiven && !fitGravure_));
     if (!modelGiven) {
         if (fitGravure_ && processGiven && process_ == "offset")
             throw HostError(Failure::Usage, "--fit-gravure fits the gravure model; it cannot go with --process offset");

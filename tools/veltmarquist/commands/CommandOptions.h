@@ -25,13 +25,14 @@ struct ScaleOption {
 // offset|gravure and --fit-gravure (gravure-fitted).
 class ModelOption {
 public:
+    explicit ModelOption(ModelChoice fallback = ModelChoice::offset) : model_(nameOf(fallback)) {}
     void add(CLI::App& command);
     // The one choice the options make; Failure::Usage when they contradict
     // each other (--process gravure --model ynsn).
     ModelChoice choice() const;
 
 private:
-    std::string model_ = "offset", process_ = "offset";
+    std::string model_, process_ = "offset";
     bool fitGravure_ = false;
     CLI::Option *modelOption_ = nullptr, *processOption_ = nullptr;
 };

@@ -39,6 +39,7 @@ Command setupReportCommand(CLI::App& app);
 Command setupCompareCommand(CLI::App& app);
 Command setupMultiChannelCommand(CLI::App& app);
 Command setupConvertCommand(CLI::App& app);
+Command setupProfileCommand(CLI::App& app);
 
 // ---- What chart and report run, and multichannel and report --inks -----------------------
 
@@ -55,6 +56,7 @@ struct ChartJob {
     std::string layout = "chart";   // chart, grid, grid:N or a CGATS file
     bool spectral = false;          // also the predicted spectra (cti3, cgats)
     std::optional<double> inkLimit; // TOTAL_INK_LIMIT in percent (cti3, cgats)
+    std::optional<double> blackLimit; // BLACK_INK_LIMIT in percent (cti3, cgats)
     ReadOptions read;
 };
 void runChart(const ChartJob& job, ChartResult& result);

@@ -200,6 +200,24 @@ void renderMultiChannel(const MultiChannelResult& result, std::ostream& out)
     printReportWritten(result.reportWritten, out);
 }
 
+void renderProfile(const ProfileResult& result, std::ostream& out)
+{
+    if (!printFormAndModel(result, out) || result.written.empty())
+        return;
+    const profile::ProfileSummary& summary = result.summary;
+    std::string levels;
+    for (double level : summary.a2bLevels)
+        levels += (levels.empty() ? "" : ", ") + number(level);
+    out << "profile: ICC " << result.version << " output profile '" << summary.description << "' written to "
+        << result.written << " (" << summary.bytes / 1024 << " KB)\n"
+        << "  A2B0-2: " << summary.a2bLevels.size() << " nodes per ink (" << levels << " %)\n"
+        << "  B2A0-2: " << summary.b2aNodes << " nodes per L*, a*, b*; perceptual is colorimetric (minimum dE*ab)\n"
+        << "  " << result.settings << "\n"
+        << "  darkest neutral L* " << fixed(summary.darkestL, 1) << "; " << summary.outOfGamut << " of "
+        << summary.b2aCount << " B2A nodes out of gamut (more than 1 dE*ab from the press's nearest colour)\n";
+    printCheck(result.check, out);
+}
+
 void renderConvert(const ConvertResult& result, std::ostream& out)
 {
     for (const FileWarnings& file : result.warnings)

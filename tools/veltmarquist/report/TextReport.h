@@ -15,6 +15,7 @@ void renderChart(const ChartResult& result, std::ostream& out);
 void renderCompare(const CompareResult& result, std::ostream& out);
 void renderMultiChannel(const MultiChannelResult& result, std::ostream& out);
 void renderConvert(const ConvertResult& result, std::ostream& out);
+void renderProfile(const ProfileResult& result, std::ostream& out);
 
 } // namespace veltmarquist
 

@@ -13,6 +13,7 @@
 #include "MeasurementFile.h"
 #include "PatchMatching.h"
 #include "PredictionCheck.h"
+#include "PrintProfile.h"
 
 #include "VeltmarquistDLL.h"
 #include "models/PrintModels.h"
@@ -46,6 +47,15 @@ struct ChartResult : FormAndModel {
     // predicts, against the model, and those it left out.
     ModelCheck check;
     std::string reportWritten;        // how messages name the delivered HTML report; empty until delivered
+};
+
+// profile FORM -o PROFILE
+struct ProfileResult : FormAndModel {
+    profile::ProfileSummary summary;
+    std::string settings;  // limits and black generation, as the report says them
+    std::string version;   // "2.4" or "4.3"
+    std::string written;   // empty until delivered
+    ModelCheck check;
 };
 
 // compare FORM
