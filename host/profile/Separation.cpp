@@ -110,6 +110,10 @@ SeparationTable separate(const ForwardTable& a2b, const InkLimits& limits, const
             const Triple lab = {L, nodeLab(1, ia, nodes, encoding), nodeLab(2, ib, nodes, encoding)};
             const double target = black.target(L, std::hypot(lab[1], lab[2]), table.darkestL, limits.black);
             const bool neutral = ia == centre && ib == centre;
+            // The neutral node and the nodes around it, between which a CMM
+            // interpolates the neutral axis, keep at least the black of the
+            // lighter neutral nodes.
+            const bool nearNeutral = std::abs(ia - centre) <= 1 && std::abs(ib - centre) <= 1;
             // Towards neutral along the axis further from it.
             const int ta = std::abs(ia - centre) >= std::abs(ib - centre) && ia != centre ? ia + (ia > centre ? -1 : 1) : ia;
             const int tb = ta == ia && ib != centre ? ib + (ib > centre ? -1 : 1) : ib;
@@ -130,11 +134,17 @@ SeparationTable separate(const ForwardTable& a2b, const InkLimits& limits, const
                 bestDistance = std::hypot(lab[1], lab[2]);
                 starts.clear();
             }
+            std::array<double, 4> neighbours{};
+            for (const std::array<double, 4>& start : starts)
+                for (size_t i = 0; i < 4; ++i)
+                    neighbours[i] += start[i] / static_cast<double>(starts.size());
             for (const std::array<double, 4>& start : starts) {
                 double d = 0.0;
-                const std::array<double, 4> x =
-                    separateColour(a2b, limits, lab, target, black.fixed, start, d, neutral ? neutralBlack : 0.0);
-                const double score = d * d + kSeparationBlackWeight * (x[3] - target) * (x[3] - target);
+                const std::array<double, 4> x = separateColour(a2b, limits, lab, target, black.fixed, start, d,
+                                                               nearNeutral ? neutralBlack : 0.0, &neighbours);
+                double score = d * d + kSeparationBlackWeight * (x[3] - target) * (x[3] - target);
+                for (size_t i = 0; i < 4; ++i)
+                    score += kSeparationNeighbourWeight * (x[i] - neighbours[i]) * (x[i] - neighbours[i]);
                 if (score < bestScore) {
                     bestScore = score;
                     best = x;
@@ -167,8 +177,9 @@ SeparationTable separate(const ForwardTable& a2b, const InkLimits& limits, const
 
 std::array<std::uint16_t, 4> inkCodes(const std::array<double, 4>& ink, const InkLimits& limits)
 {
-    // Round each ink, then take any excess back from the inks that rounded
-    // up most (C, M, Y before K at a tie, so that black keeps its course).
+    // Round each ink, then take any excess back from the colour ink that
+    // rounded up most; black gives only when C, M and Y have nothing left,
+    // so that it keeps its course along the neutral axis to the last code.
     int code[4];
     double exact[4];
     int sum = 0;
@@ -181,9 +192,11 @@ std::array<std::uint16_t, 4> inkCodes(const std::array<double, 4>& ink, const In
     }
     while (sum > limits.totalCode()) {
         int most = -1;
-        for (int i = 0; i < 4; ++i)
+        for (int i = 0; i < 3; ++i)
             if (code[i] > 0 && (most < 0 || code[i] - exact[i] > code[most] - exact[most]))
                 most = i;
+        if (most < 0)
+            most = 3;
         --code[most];
         --sum;
     }

@@ -48,6 +48,12 @@ struct InkLimits {
 };
 // lambda of the objective: (K - target as a fraction)^2 against dE*ab^2.
 constexpr double kSeparationBlackWeight = 4.0;
+// mu: (ink - the neighbours' ink, as fractions)^2 per ink against dE*ab^2.
+// It keeps a node on its neighbours' way of printing a colour where two
+// ways fit the target about equally, so that interpolating between nodes
+// never crosses from one to the other; in gamut it moves the colour by
+// less than 0.01 dE*ab.
+constexpr double kSeparationNeighbourWeight = 8.0;
 
 // Codes a node's ink sum keeps below the limit: a 16-bit CMM rounds each
 // interpolated channel (twice, in a 4-input table), which can add up to
@@ -77,10 +83,13 @@ std::array<std::uint16_t, 4> inkCodes(const std::array<double, 4>& ink, const In
 
 // The separation of one colour under the table: the solver every node runs,
 // from `start` (fractions). Returns C, M, Y, K (fractions) and the colour's
-// dE*ab from the target in `distance`.
+// dE*ab from the target in `distance`. With `neighbours` (the mean of the
+// neighbouring nodes' separations) the solver also stays near them, with
+// weight kSeparationNeighbourWeight.
 std::array<double, 4> separateColour(const ForwardTable& a2b, const InkLimits& limits, const Triple& lab,
                                      double blackTarget, bool fixedBlack, const std::array<double, 4>& start,
-                                     double& distance, double lowestBlack = 0.0);
+                                     double& distance, double lowestBlack = 0.0,
+                                     const std::array<double, 4>* neighbours = nullptr);
 
 } // namespace veltmarquist::profile
 

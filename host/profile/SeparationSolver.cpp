@@ -39,15 +39,22 @@ struct Box {
     }
 };
 
-// Residuals (dL*, da*, db*, sqrt(lambda) dK) and their Jacobian at x.
+// Residuals (dL*, da*, db*, sqrt(lambda) dK, then sqrt(mu) times each
+// ink's distance from the neighbours' separation) and their Jacobian at x.
 struct Residuals {
-    std::array<double, 4> r{};
-    std::array<std::array<double, 4>, 4> J{};
-    double value() const { return r[0] * r[0] + r[1] * r[1] + r[2] * r[2] + r[3] * r[3]; }
+    std::array<double, 8> r{};
+    std::array<std::array<double, 4>, 8> J{};
+    double value() const
+    {
+        double sum = 0.0;
+        for (double v : r)
+            sum += v * v;
+        return sum;
+    }
 };
 
 Residuals residualsAt(const ForwardTable& a2b, const std::array<double, 4>& x, const Triple& target, double blackTarget,
-                      bool withJacobian)
+                      const std::array<double, 4>* neighbours, bool withJacobian)
 {
     Residuals out;
     std::array<std::array<double, 4>, 3> jacobian{};
@@ -59,6 +66,13 @@ Residuals residualsAt(const ForwardTable& a2b, const std::array<double, 4>& x, c
     }
     out.r[3] = weight * (x[3] - blackTarget);
     out.J[3] = {0.0, 0.0, 0.0, weight};
+    if (neighbours) {
+        const double pull = std::sqrt(kSeparationNeighbourWeight);
+        for (size_t i = 0; i < 4; ++i) {
+            out.r[4 + i] = pull * (x[i] - (*neighbours)[i]);
+            out.J[4 + i][i] = pull;
+        }
+    }
     return out;
 }
 
@@ -120,7 +134,7 @@ int InkLimits::blackCode() const
 
 std::array<double, 4> separateColour(const ForwardTable& a2b, const InkLimits& limits, const Triple& lab,
                                      double blackTarget, bool fixedBlack, const std::array<double, 4>& start,
-                                     double& distance, double lowestBlack)
+                                     double& distance, double lowestBlack, const std::array<double, 4>* neighbours)
 {
     Box box;
     box.high = {1.0, 1.0, 1.0, limits.black};
@@ -132,13 +146,13 @@ std::array<double, 4> separateColour(const ForwardTable& a2b, const InkLimits& l
     box.high[3] = std::max(box.high[3], box.low[3]);
 
     std::array<double, 4> x = box.project(start);
-    Residuals current = residualsAt(a2b, x, lab, blackTarget, true);
+    Residuals current = residualsAt(a2b, x, lab, blackTarget, neighbours, true);
     double damping = 1e-4;
     for (int iteration = 0; iteration < 80; ++iteration) {
         std::array<double, 4> gradient{};
         std::array<std::array<double, 4>, 4> H{};
         for (size_t i = 0; i < 4; ++i)
-            for (size_t k = 0; k < 4; ++k) {
+            for (size_t k = 0; k < 8; ++k) {
                 gradient[i] += current.J[k][i] * current.r[k];
                 for (size_t j = 0; j < 4; ++j)
                     H[i][j] += current.J[k][i] * current.J[k][j];
@@ -166,7 +180,7 @@ std::array<double, 4> separateColour(const ForwardTable& a2b, const InkLimits& l
         if (!solved)
             break;
         const std::array<double, 4> next = box.project({x[0] + step[0], x[1] + step[1], x[2] + step[2], x[3] + step[3]});
-        const Residuals trial = residualsAt(a2b, next, lab, blackTarget, true);
+        const Residuals trial = residualsAt(a2b, next, lab, blackTarget, neighbours, true);
         if (trial.value() < current.value()) {
             double moved = 0.0;
             for (size_t i = 0; i < 4; ++i)

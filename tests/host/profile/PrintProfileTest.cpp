@@ -130,7 +130,8 @@ TEST(PrintProfile, RoundedInkHoldsTheLimitsToTheLastCode)
         {{0, 0, 0, 0}, {0, 0, 0, 0}},
         {{0.5, 0.25, 0.125, 0.0625}, {32768, 16384, 8192, 4096}}, // rounded half up, within the limits
         {{0.0, 0.0, 0.0, 1.0}, {0, 0, 0, 62258}},                 // K above its limit
-        {{1.0, 1.0, 0.05, 0.95}, {65534, 65534, 3276, 62257}},    // at 300 %: the inks that rounded up most give back
+        {{1.0, 1.0, 0.05, 0.95}, {65534, 65534, 3275, 62258}},    // at 300 %: the colour inks that rounded up most give back
+        {{0.0, 0.0, 0.0, 3.5}, {0, 0, 0, 62258}},                 // black alone, held to its own limit
     };
     for (const auto& c : cases)
         EXPECT_EQ(inkCodes(c.ink, limits), c.codes) << c.ink[0] << " " << c.ink[1] << " " << c.ink[2] << " " << c.ink[3];
@@ -208,6 +209,40 @@ TEST(PrintProfile, SeparationsHoldTheLimitsKeepWhiteCleanAndTheNeutralBlackRisin
             EXPECT_GE(axis[4 * step + 3], axis[4 * step - 1]) << "L* " << 100 - step;
         EXPECT_GT(axis[4 * 100 + 3], 30000) << "black in the shadows";
         EXPECT_LE(axis[4 * 100 + 3], 62258);
+    }
+}
+
+TEST(PrintProfile, NeighbouringSeparationsChangeOnlyAsMuchAsTheirColours)
+{
+    // A jump between two ways of printing a colour shows where the table is
+    // interpolated: the ink halfway between two reproduced neighbours then
+    // prints a colour away from halfway between theirs.
+    std::vector<double> levels;
+    for (int i = 0; i <= 16; ++i)
+        levels.push_back(100.0 * i / 16);
+    const ForwardTable a2b(*sampleModel().model, levels, LabEncoding{IccVersion::v2});
+    for (const char* name : {"heavy", "light"}) {
+        SCOPED_TRACE(name);
+        const SeparationTable table = separate(a2b, InkLimits{}, *blackGenerationNamed(name), 33);
+        const size_t n = 33;
+        double worst = 0.0;
+        for (size_t node = 0; node < n * n * n; ++node)
+            for (const size_t stride : {1 * n * n, n, size_t(1)}) {
+                const size_t other = node + stride;
+                if (other >= n * n * n || (stride == 1 && node % n == n - 1) || (stride == n && node / n % n == n - 1) ||
+                    table.gamut[node] != 0 || table.gamut[other] != 0)
+                    continue;
+                double ink[4], neighbour[4], halfway[4];
+                for (size_t i = 0; i < 4; ++i) {
+                    ink[i] = table.entries[4 * node + i] / 65535.0;
+                    neighbour[i] = table.entries[4 * other + i] / 65535.0;
+                    halfway[i] = 0.5 * (ink[i] + neighbour[i]);
+                }
+                const Triple p = a2b.lab(ink), q = a2b.lab(neighbour), h = a2b.lab(halfway);
+                worst = std::max(worst, std::hypot(h[0] - 0.5 * (p[0] + q[0]), h[1] - 0.5 * (p[1] + q[1]),
+                                                   h[2] - 0.5 * (p[2] + q[2])));
+            }
+        EXPECT_LT(worst, 1.25) << "dE*ab off halfway between neighbouring nodes";
     }
 }
 
