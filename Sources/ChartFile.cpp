@@ -1,15 +1,16 @@
 // Chart file conventions.
 //
-// Charts are tab-separated CGATS-style text. Every line written with std::endl
-// ends in LF and flushes the stream; CR LF appears only where a header literal
-// holds it ("IT8\r\n", "LGOROWLENGTH\t54\r\n", the multi-channel header), so a
-// file mixes both line ends on purpose: profile builders that read these charts
-// expect exactly these bytes. Doubles use the stream's default format, the
-// same text as printf's %g with six significant digits.
+// Charts are tab-separated CGATS-style text. Every line ends in LF; CR LF
+// appears only where a header literal holds it ("IT8\r\n", "LGOROWLENGTH\t54\r\n",
+// the multi-channel header), so a file mixes both line ends on purpose:
+// profile builders that read these charts expect exactly these bytes. Doubles
+// use the stream's default format, the same text as printf's %g with six
+// significant digits.
 #include "ChartFile.h"
 
 #include "models/PrintModels.h"
 
+#include <charconv>
 #include <cmath>
 #include <locale>
 #include <sstream>
@@ -23,16 +24,6 @@ void open(std::ofstream& stream, const char* path)
     if (!stream.is_open())
         throw Exceptions(1);
     stream.imbue(std::locale::classic());
-}
-
-void writeXYZHeader(std::ostream& stream, int sets)
-{
-    stream << "IT8\r\nNUMBER_OF_SETS\t" << sets << std::endl;
-    stream << "NUMBER_OF_FIELDS\t" << 8 << std::endl;
-    stream << "BEGIN_DATA_FORMAT" << std::endl;
-    stream << "Sample_Name\tCMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K\tXYZ_X\tXYZ_Y\tXYZ_Z\t" << std::endl;
-    stream << "END_DATA_FORMAT" << std::endl;
-    stream << "BEGIN_DATA" << std::endl;
 }
 
 void limitY(double XYZ[3])
@@ -50,16 +41,66 @@ double cut(double value)
     return std::floor(value * 100.0) / 100.0;
 }
 
-void writeXYZLine(std::ostream& stream, int number, const double channel[4], const double XYZ[3])
+ChartStream::ChartStream(const char* path, bool plain) : plain_(plain)
 {
-    stream << number << '\t' << channel[0] << '\t' << channel[1] << '\t' << channel[2] << '\t' << channel[3]
-           << '\t' << cut(XYZ[0]) << '\t' << cut(XYZ[1]) << '\t' << cut(XYZ[2]) << std::endl;
+    open(file_, path);
 }
 
-void finish(std::ofstream& stream)
+ChartStream& ChartStream::operator<<(const char* text)
 {
-    stream << "END_DATA" << std::endl;
-    stream.close();
+    if (plain_)
+        file_ << text;
+    else
+        text_ += text;
+    return *this;
+}
+
+ChartStream& ChartStream::operator<<(char c)
+{
+    if (plain_)
+        file_ << c;
+    else
+        text_ += c;
+    return *this;
+}
+
+ChartStream& ChartStream::operator<<(int value)
+{
+    if (plain_) {
+        file_ << value;
+    } else {
+        char digits[16];
+        text_.append(digits, std::to_chars(digits, digits + sizeof digits, value).ptr);
+    }
+    return *this;
+}
+
+ChartStream& ChartStream::operator<<(double value)
+{
+    if (plain_) {
+        file_ << value;
+    } else {
+        // The stream's default: %g with six significant digits.
+        char digits[32];
+        text_.append(digits, std::to_chars(digits, digits + sizeof digits, value, std::chars_format::general, 6).ptr);
+    }
+    return *this;
+}
+
+ChartStream& ChartStream::operator<<(EndLine)
+{
+    if (plain_)
+        file_ << std::endl;
+    else
+        text_ += '\n';
+    return *this;
+}
+
+void ChartStream::finish()
+{
+    *this << "END_DATA" << endl;
+    file_.write(text_.data(), static_cast<std::streamsize>(text_.size()));
+    file_.close();
 }
 
 } // namespace chartfile
@@ -93,7 +134,7 @@ std::string xyzChartText(const std::vector<Cmyk>& coverages, const std::vector<T
         Triple limited = limitToChartY(XYZ[i]);
         chartfile::writeXYZLine(stream, static_cast<int>(i) + 1, coverages[i].data(), limited.data());
     }
-    stream << "END_DATA" << std::endl;
+    stream << "END_DATA" << chartfile::endl;
     return stream.str();
 }
 

@@ -8,6 +8,7 @@
 #include "ChartFile.h"
 #include "MathProfile.h"
 #include "ProfileSteps.h"
+#include "models/InkAreaMemo.h"
 #include "models/PrintModels.h"
 
 #include <cmath>
@@ -19,7 +20,7 @@ namespace {
 using Cmyk = std::array<unsigned char, 4>;
 
 // Patches 1 to 26 of the chart: solids, overprints and the paper.
-const Cmyk kSolidsAndOverprints[] = {
+constexpr Cmyk kSolidsAndOverprints[] = {
     {100, 0, 0, 0}, {0, 100, 0, 0}, {0, 0, 100, 0}, {100, 100, 0, 0}, {100, 0, 100, 0}, {0, 100, 100, 0},
     {100, 100, 100, 0},                                                                 // 1..7
     {70, 70, 0, 0}, {70, 0, 70, 0}, {0, 70, 70, 0}, {40, 40, 0, 0}, {0, 40, 40, 0}, {40, 40, 40, 0},
@@ -31,7 +32,7 @@ const Cmyk kSolidsAndOverprints[] = {
 static_assert(sizeof kSolidsAndOverprints / sizeof kSolidsAndOverprints[0] == 26, "patches 1 to 26");
 
 // Patches 54 to 96: three-colour combinations without black.
-const Cmyk kChromaticMixes[] = {
+constexpr Cmyk kChromaticMixes[] = {
     {40, 100, 0, 0}, {40, 100, 40, 0}, {0, 100, 40, 0}, {40, 100, 100, 0}, {0, 40, 100, 0},
     {40, 40, 100, 0}, {70, 70, 70, 0}, {40, 0, 100, 0}, {100, 40, 100, 0}, {100, 0, 40, 0},
     {100, 40, 40, 0}, {100, 40, 0, 0}, {100, 100, 40, 0}, {70, 100, 20, 0}, {20, 70, 20, 0},
@@ -45,29 +46,44 @@ const Cmyk kChromaticMixes[] = {
 static_assert(sizeof kChromaticMixes / sizeof kChromaticMixes[0] == 43, "patches 54 to 96");
 
 // Patches 130 to 138 (with K 20) and 145 to 153 (with K 60).
-const Cmyk kBlackOverprints[] = {
+constexpr Cmyk kBlackOverprints[] = {
     {100, 0, 0, 0}, {0, 100, 0, 0}, {0, 0, 100, 0}, {100, 100, 0, 0}, {100, 0, 100, 0},
     {0, 100, 100, 0}, {40, 40, 0, 0}, {40, 0, 40, 0}, {0, 40, 40, 0},
 };
 
-std::array<Cmyk, 900> buildChart()
+// The 900 combinations, built at compile time.
+struct ChartRows {
+    std::array<Cmyk, 900> rows{};
+    size_t size = 0;
+
+    constexpr void add(int c, int m, int y, int k)
+    {
+        rows[size++] = Cmyk{static_cast<unsigned char>(c), static_cast<unsigned char>(m),
+                            static_cast<unsigned char>(y), static_cast<unsigned char>(k)};
+    }
+    template <size_t Levels>
+    constexpr void grid(int k, const int (&levels)[Levels]) // yellow outermost, magenta innermost
+    {
+        for (int y : levels)
+            for (int c : levels)
+                for (int m : levels)
+                    add(c, m, y, k);
+    }
+};
+
+constexpr ChartRows buildChart()
 {
-    std::array<Cmyk, 900> chart{};
-    size_t n = 0;
-    auto add = [&](int c, int m, int y, int k) {
-        chart.at(n++) = Cmyk{static_cast<unsigned char>(c), static_cast<unsigned char>(m),
-                             static_cast<unsigned char>(y), static_cast<unsigned char>(k)};
-    };
+    ChartRows chart;
     for (const Cmyk& e : kSolidsAndOverprints)
-        add(e[0], e[1], e[2], e[3]);
+        chart.add(e[0], e[1], e[2], e[3]);
     // 27..53: single-ink steps; black has no 10 % step here.
     const int steps[] = {90, 80, 70, 60, 40, 20, 10};
     for (int ink = 0; ink < 4; ++ink)
         for (int s : steps)
             if (!(ink == 3 && s == 10))
-                add(ink == 0 ? s : 0, ink == 1 ? s : 0, ink == 2 ? s : 0, ink == 3 ? s : 0);
+                chart.add(ink == 0 ? s : 0, ink == 1 ? s : 0, ink == 2 ? s : 0, ink == 3 ? s : 0);
     for (const Cmyk& e : kChromaticMixes)
-        add(e[0], e[1], e[2], e[3]);
+        chart.add(e[0], e[1], e[2], e[3]);
     // 97..123: near-neutral tones with black, 124..129 the same tones without.
     const int tones[6][3] = {{100, 90, 90}, {80, 70, 70}, {60, 40, 40}, {40, 20, 20}, {20, 10, 10}, {10, 10, 10}};
     const int toneBlacks[6][5] = {{100, 80, 60, -1, -1}, {100, 80, 60, 40, -1}, {100, 80, 60, 40, 20},
@@ -75,43 +91,41 @@ std::array<Cmyk, 900> buildChart()
     for (int t = 0; t < 6; ++t)
         for (int k : toneBlacks[t])
             if (k >= 0)
-                add(tones[t][0], tones[t][1], tones[t][2], k);
+                chart.add(tones[t][0], tones[t][1], tones[t][2], k);
     for (const auto& tone : tones)
-        add(tone[0], tone[1], tone[2], 0);
+        chart.add(tone[0], tone[1], tone[2], 0);
     // 130..153: overprints with black 20, 40 and 60.
     for (const Cmyk& e : kBlackOverprints)
-        add(e[0], e[1], e[2], 20);
+        chart.add(e[0], e[1], e[2], 20);
     for (size_t e = 3; e < 9; ++e) // black 40 only under the six two-ink overprints
-        add(kBlackOverprints[e][0], kBlackOverprints[e][1], kBlackOverprints[e][2], 40);
+        chart.add(kBlackOverprints[e][0], kBlackOverprints[e][1], kBlackOverprints[e][2], 40);
     for (const Cmyk& e : kBlackOverprints)
-        add(e[0], e[1], e[2], 60);
-    // 154..899: one full grid per black level, yellow outermost, magenta innermost.
-    const std::vector<int> fine = {0, 10, 20, 40, 70, 100}, medium = {0, 20, 40, 70, 100}, coarse = {0, 40, 70, 100};
-    const struct {
-        int k;
-        const std::vector<int>* levels;
-    } grids[] = {{0, &fine}, {20, &fine}, {40, &medium}, {60, &medium}, {80, &coarse}};
-    for (const auto& grid : grids)
-        for (int y : *grid.levels)
-            for (int c : *grid.levels)
-                for (int m : *grid.levels)
-                    add(c, m, y, grid.k);
-    add(0, 0, 0, 10); // 900
-    if (n != chart.size())
-        throw std::logic_error("characterisation chart table is incomplete");
+        chart.add(e[0], e[1], e[2], 60);
+    // 154..899: one full grid per black level.
+    const int fine[] = {0, 10, 20, 40, 70, 100}, medium[] = {0, 20, 40, 70, 100}, coarse[] = {0, 40, 70, 100};
+    chart.grid(0, fine);
+    chart.grid(20, fine);
+    chart.grid(40, medium);
+    chart.grid(60, medium);
+    chart.grid(80, coarse);
+    chart.add(0, 0, 0, 10); // 900
     return chart;
 }
 
+constexpr ChartRows kChart = buildChart();
+static_assert(kChart.size == 900, "the characterisation chart holds 900 combinations");
+
 } // namespace
 
-const std::array<std::array<unsigned char, 4>, 900> MathProfile::toBeCalculated = buildChart();
+// Constant-initialised: nothing is built when the library loads.
+const std::array<std::array<unsigned char, 4>, 900> MathProfile::toBeCalculated = kChart.rows;
 
-void profilesteps::predictFourColour(MathProfile& profile, PrintProcess process)
+void profilesteps::predictFourColour(MathProfile& profile, PrintProcess process, veltmarquist::models::InkAreaMemo* memo)
 {
     if (process == VM_PROCESS_GRAVURE)
         calcGravureSampleByOrder(profile, profile.inkOrder);
     else
-        profile.calcOffsetSample();
+        calcOffsetSample(profile, memo);
 }
 
 void MathProfile::calculateChart(double** rows, PrintProcess process, const char* path)
@@ -119,20 +133,20 @@ void MathProfile::calculateChart(double** rows, PrintProcess process, const char
     if (process != VM_PROCESS_OFFSET && process != VM_PROCESS_GRAVURE)
         throw std::invalid_argument("the 900-patch chart is made with process 0 (offset) or 1 (gravure)");
 
-    std::ofstream stream;
-    chartfile::open(stream, path);
+    chartfile::ChartStream stream(path);
     profilesteps::readForm(*this, rows);
     chartfile::writeXYZHeader(stream, 900);
 
     ColorPatch& sample = patchSlots[kSlotCurrentSample];
+    veltmarquist::models::InkAreaMemo memo;
     for (size_t i = 0; i < toBeCalculated.size(); ++i) {
         const auto& entry = toBeCalculated[i];
         setSample(entry[0], entry[1], entry[2], entry[3], 0.0, 0.0, 0.0);
-        profilesteps::predictFourColour(*this, process);
+        profilesteps::predictFourColour(*this, process, kLiteralBuild ? nullptr : &memo);
         chartfile::limitY(sample.XYZ);
         chartfile::writeXYZLine(stream, static_cast<int>(i) + 1, sample.channel, sample.XYZ);
     }
-    chartfile::finish(stream);
+    stream.finish();
 }
 
 void MathProfile::calculateChart46(double** rows, PrintProcess process, const char* path, bool measured)
@@ -140,8 +154,7 @@ void MathProfile::calculateChart46(double** rows, PrintProcess process, const ch
     if (!measured && process != VM_PROCESS_OFFSET && process != VM_PROCESS_GRAVURE)
         throw std::invalid_argument("the modelled 46-step chart is made with process 0 (offset) or 1 (gravure)");
 
-    std::ofstream stream;
-    chartfile::open(stream, path);
+    chartfile::ChartStream stream(path);
     profilesteps::readForm(*this, rows);
     chartfile::writeXYZHeader(stream, 46);
 
@@ -158,7 +171,7 @@ void MathProfile::calculateChart46(double** rows, PrintProcess process, const ch
         chartfile::limitY(sample.XYZ);
         chartfile::writeXYZLine(stream, i + 1, sample.channel, sample.XYZ);
     }
-    chartfile::finish(stream);
+    stream.finish();
 }
 
 namespace veltmarquist {
@@ -185,17 +198,16 @@ std::vector<Cmyk> characterisationChart()
 
 void MathProfile::convertChart(double** rows, int count, const char* path, double* channels, PrintProcess process)
 {
-    std::ofstream stream;
-    chartfile::open(stream, path);
-    stream << "LGOROWLENGTH\t54\r\nNUMBER_OF_SETS\t" << count - 2 << std::endl;
-    stream << "NUMBER_OF_FIELDS\t" << 41 << std::endl;
-    stream << "BEGIN_DATA_FORMAT" << std::endl;
+    chartfile::ChartStream stream(path);
+    stream << "LGOROWLENGTH\t54\r\nNUMBER_OF_SETS\t" << count - 2 << chartfile::endl;
+    stream << "NUMBER_OF_FIELDS\t" << 41 << chartfile::endl;
+    stream << "BEGIN_DATA_FORMAT" << chartfile::endl;
     stream << "Sample_Name\tCMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K";
     for (int nm = 380; nm <= 730; nm += 10)
         stream << "\tnm" << nm;
-    stream << '\t' << std::endl;
-    stream << "END_DATA_FORMAT" << std::endl;
-    stream << "BEGIN_DATA" << std::endl;
+    stream << '\t' << chartfile::endl;
+    stream << "END_DATA_FORMAT" << chartfile::endl;
+    stream << "BEGIN_DATA" << chartfile::endl;
 
     const bool converting = process == VM_PROCESS_CHART_CONVERT || process == VM_PROCESS_CHART_BLEND;
     double w = 0.0;
@@ -242,7 +254,7 @@ void MathProfile::convertChart(double** rows, int count, const char* path, doubl
             stream << sample.channel[k] << '\t';
         for (int b = 0; b < kBands; ++b)
             stream << sample.spectrum[b] << '\t';
-        stream << std::endl;
+        stream << chartfile::endl;
     }
-    chartfile::finish(stream);
+    stream.finish();
 }

@@ -17,7 +17,6 @@
 #include "MathProfile.h"
 #include "ProfileSteps.h"
 
-#include <charconv>
 #include <cmath>
 
 // ICC profile connection space white (D50). The weighting table's own column
@@ -72,23 +71,46 @@ static_assert(sizeof(MathProfile::Gewichtsfaktoren_XYZ_D50) == 36 * 3 * sizeof(d
 // Entry i is the cube root of i/1024 rounded to nine decimals, then to the
 // nearest float. Nine decimals (not the correctly rounded float cube root)
 // are what the published table holds: at indices 37, 86, 135, 285, 339, 555,
-// 787 and 804 the two differ by one unit in the last place.
-static std::array<float, 1025> buildCubeRootSamples()
+// 787 and 804 the two differ by one unit in the last place. The table is
+// built at compile time: the root by Newton steps in long double, the nine
+// decimals as an integer rounded to nearest, the float from that integer over
+// 10^9. A test rebuilds it from std::cbrt and decimal text and compares.
+namespace {
+
+constexpr long double cubeRoot(long double x)
+{
+    if (x <= 0.0L)
+        return 0.0L;
+    long double root = 1.0L; // x <= 1: Newton falls monotonically onto the root from above
+    for (int step = 0; step < 200; ++step) {
+        const long double next = root - (root * root * root - x) / (3.0L * root * root);
+        if (next >= root)
+            break;
+        root = next;
+    }
+    return root;
+}
+
+constexpr std::array<float, 1025> buildCubeRootSamples()
 {
     std::array<float, 1025> table{};
     for (int i = 0; i <= 1024; ++i) {
-        const long double root = std::cbrt(static_cast<long double>(i) / 1024.0L);
-        char text[32];
-        // to_chars/from_chars are exact and ignore the C locale.
-        const auto printed = std::to_chars(text, text + sizeof text, root, std::chars_format::fixed, 9);
-        float value = 0.0f;
-        std::from_chars(text, printed.ptr, value, std::chars_format::fixed);
-        table[static_cast<size_t>(i)] = value;
+        const long double scaled = cubeRoot(static_cast<long double>(i) / 1024.0L) * 1e9L;
+        auto decimals = static_cast<long long>(scaled);
+        if (scaled - static_cast<long double>(decimals) >= 0.5L)
+            ++decimals;
+        table[static_cast<size_t>(i)] = static_cast<float>(static_cast<long double>(decimals) / 1e9L);
     }
     return table;
 }
 
-const std::array<float, 1025> MathProfile::cuberoot_samples = buildCubeRootSamples();
+constexpr std::array<float, 1025> kCubeRootSamples = buildCubeRootSamples();
+static_assert(kCubeRootSamples[0] == 0.0f && kCubeRootSamples[128] == 0.5f && kCubeRootSamples[1024] == 1.0f,
+              "exact cube roots stay exact");
+
+} // namespace
+
+const std::array<float, 1025> MathProfile::cuberoot_samples = kCubeRootSamples;
 
 namespace colorimetry {
 

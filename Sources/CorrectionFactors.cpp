@@ -12,8 +12,10 @@
 // Every search compares strictly (a candidate wins only when the best so far
 // is greater), so ties go to the candidate met first; best scores start at 10000.
 #include "GrayFitGrid.h"
+#include "LiteralBuild.h"
 #include "MathProfile.h"
 #include "ProfileSteps.h"
+#include "models/InkAreaMemo.h"
 
 #include <cmath>
 #include <cstring>
@@ -42,7 +44,7 @@ void setGrayFitFields(MathProfile& profile, const int point[5])
 
 void MathProfile::calculateGrayDiffFactor(double** rows)
 {
-    fitGrayDiffFactor(*this, rows, false);
+    fitGrayDiffFactor(*this, rows, kLiteralBuild);
 }
 
 void MathProfile::calculateGrayDiffFactorStraightforward(double** rows)
@@ -50,15 +52,16 @@ void MathProfile::calculateGrayDiffFactorStraightforward(double** rows)
     fitGrayDiffFactor(*this, rows, true);
 }
 
-double profilesteps::scoreGrayPoint(MathProfile& profile, const lab& grey3, const lab& grey4, const int point[5])
+double profilesteps::scoreGrayPoint(MathProfile& profile, const lab& grey3, const lab& grey4, const int point[5],
+                                    veltmarquist::models::InkAreaMemo* memo)
 {
     setGrayFitFields(profile, point);
     const ColorPatch& sample = profile.patchSlots[MathProfile::kSlotCurrentSample];
     profile.setSample(40.0, 40.0, 40.0, 0.0, 0.0, 0.0, 0.0);
-    profile.calcOffsetSample();
+    calcOffsetSample(profile, memo);
     const double dE3 = deltaE(grey3, labOf(profile, sample));
     profile.setSample(40.0, 40.0, 40.0, 40.0, 0.0, 0.0, 0.0);
-    profile.calcOffsetSample();
+    calcOffsetSample(profile, memo);
     const double dE4 = deltaE(grey4, labOf(profile, sample));
     return std::sqrt(dE3 * dE3 + dE4 * dE4);
 }
@@ -97,7 +100,12 @@ void profilesteps::fitGrayDiffFactor(MathProfile& profile, double** rows, bool s
     // Rows 44 and 45 are read after readData, which may have exchanged rows.
     const lab grey3 = measuredLab(rows[44]);
     const lab grey4 = measuredLab(rows[45]);
-    auto score = [&](const GrayPoint& point) { return scoreGrayPoint(profile, grey3, grey4, point.p); };
+    // A move changes one ink's exponent (the limit: all four), so the fine
+    // search meets most d^e rows again.
+    veltmarquist::models::InkAreaMemo memo;
+    auto score = [&](const GrayPoint& point) {
+        return scoreGrayPoint(profile, grey3, grey4, point.p, straightforward ? nullptr : &memo);
+    };
 
     // Coarse grid. The fast evaluation finds the same best point and score as
     // the point-by-point loop (GrayFitFastPath.cpp tells why); the loop stays

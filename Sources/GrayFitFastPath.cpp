@@ -36,6 +36,7 @@
 
 #include <cmath>
 #include <cstring>
+#include <limits>
 
 // The lane loops are built for the baseline instruction set and, on x86-64,
 // also for AVX2 and AVX-512, chosen at load time. All give the same bits:
@@ -127,24 +128,75 @@ inline void addBand(const double (&w)[16], const double* S, int j, int l, Sums& 
     sums.Z[l] += s * kXYZWeights[j][2];
 }
 
-// Three-colour grey, one yellow factor per lane. The weights are written as
-// calcOffsetSample writes them.
+// Three-colour grey at one band for yellow lanes first..last-1. The weights
+// are written as calcOffsetSample writes them.
+template <typename Sums>
+inline void yellowLanesAtBand(const Primaries& primaries, const InkRow& cyan, const InkRow& magenta,
+                              const InkRow& black, const InkLanes<kYellowLanes>& yellow, int j, int first, int last,
+                              Sums& sums)
+{
+    const double* S = primaries[j];
+    const double aC = cyan.a[j], aM = magenta.a[j], aK = black.a[j];
+    const double nC = cyan.n[j], nM = magenta.n[j], nK = black.n[j];
+    for (int l = first; l < last; ++l) {
+        const double aY = yellow.a[j][l], nY = yellow.n[j][l];
+        const double w[16] = {aC * nM * nY * nK, aM * nC * nY * nK, aY * nC * nM * nK, aK * nC * nM * nY,
+                              aM * aY * nC * nK, aC * aY * nM * nK, aC * aM * nY * nK, aC * aK * nM * nY,
+                              aM * aK * nC * nY, aY * aK * nC * nM, aM * aY * aK * nC, aC * aY * aK * nM,
+                              aC * aM * aK * nY, aC * aM * aY * nK, aC * aM * aY * aK, nC * nM * nY * nK};
+        addBand(w, S, j, l, sums);
+    }
+}
+
+// Three-colour grey, one yellow factor per lane.
 GRAYFIT_LANE_LOOP
 void yellowLaneSums(const Primaries& primaries, const InkRow& cyan, const InkRow& magenta, const InkRow& black,
                     const InkLanes<kYellowLanes>& yellow, LaneSums<kYellowLanes>& out)
 {
     LaneSums<kYellowLanes> sums = {};
+    for (int j = 0; j < kBands; ++j)
+        yellowLanesAtBand(primaries, cyan, magenta, black, yellow, j, 0, kYellowLanes, sums);
+    out = sums;
+}
+
+// The same for one lane alone, bit for bit (lanes never mix).
+void yellowLaneSum(const Primaries& primaries, const InkRow& cyan, const InkRow& magenta, const InkRow& black,
+                   const InkLanes<kYellowLanes>& yellow, int lane, LaneSums<kYellowLanes>& out)
+{
+    out.X[lane] = out.Y[lane] = out.Z[lane] = 0.0;
+    for (int j = 0; j < kBands; ++j)
+        yellowLanesAtBand(primaries, cyan, magenta, black, yellow, j, lane, lane + 1, out);
+}
+
+// The same when black prints nothing (aK = 0, nK = 1 in every band) and no
+// product of C, M, Y areas overflows: each weight with aK is a zero whose
+// term adds nothing to R (x + 0 = x, and the sum starts at +0), and each with
+// nK is x * 1 = x, so the eight primaries without black give the same R bit
+// for bit with half the work.
+GRAYFIT_LANE_LOOP
+void yellowLaneSumsWithoutBlack(const Primaries& primaries, const InkRow& cyan, const InkRow& magenta,
+                                const InkLanes<kYellowLanes>& yellow, LaneSums<kYellowLanes>& out)
+{
+    LaneSums<kYellowLanes> sums = {};
     for (int j = 0; j < kBands; ++j) {
         const double* S = primaries[j];
-        const double aC = cyan.a[j], aM = magenta.a[j], aK = black.a[j];
-        const double nC = cyan.n[j], nM = magenta.n[j], nK = black.n[j];
+        const double aC = cyan.a[j], aM = magenta.a[j];
+        const double nC = cyan.n[j], nM = magenta.n[j];
         for (int l = 0; l < kYellowLanes; ++l) {
             const double aY = yellow.a[j][l], nY = yellow.n[j][l];
-            const double w[16] = {aC * nM * nY * nK, aM * nC * nY * nK, aY * nC * nM * nK, aK * nC * nM * nY,
-                                  aM * aY * nC * nK, aC * aY * nM * nK, aC * aM * nY * nK, aC * aK * nM * nY,
-                                  aM * aK * nC * nY, aY * aK * nC * nM, aM * aY * aK * nC, aC * aY * aK * nM,
-                                  aC * aM * aK * nY, aC * aM * aY * nK, aC * aM * aY * aK, nC * nM * nY * nK};
-            addBand(w, S, j, l, sums);
+            double R = 0.0;
+            R += aC * nM * nY * S[0];  // cyan
+            R += aM * nC * nY * S[1];  // magenta
+            R += aY * nC * nM * S[2];  // yellow
+            R += aM * aY * nC * S[4];  // magenta + yellow
+            R += aC * aY * nM * S[5];  // cyan + yellow
+            R += aC * aM * nY * S[6];  // cyan + magenta
+            R += aC * aM * aY * S[13]; // cyan + magenta + yellow
+            R += nC * nM * nY * S[15]; // paper
+            const double s = std::fabs(R);
+            sums.X[l] += s * kXYZWeights[j][0];
+            sums.Y[l] += s * kXYZWeights[j][1];
+            sums.Z[l] += s * kXYZWeights[j][2];
         }
     }
     out = sums;
@@ -204,7 +256,38 @@ struct GridEvaluator::Tables {
     // Four-colour grey: black varies across lanes.
     InkRow cyan4[kCyanCount], magenta4[kMagentaCount], yellow4[kYellowCount];
     InkLanes<kBlackLanes> black4;
+    // yellowLaneSumsWithoutBlack serves the three-colour grey at this limit
+    // for the cyan and magenta rows marked bounded and the yellow lanes
+    // marked bounded; a lane with an infinite area is NaN (see threeColourSums),
+    // any other is summed in full.
+    enum class Lane { bounded, infinite, other };
+    bool threeColourWithoutBlack = false;
+    bool cyan3Bounded[kCyanCount] = {}, magenta3Bounded[kMagentaCount] = {};
+    Lane yellow3Lane[kYellowLanes] = {};
 };
+
+namespace {
+
+// Black prints nothing in this row: aK = 0 (either sign) and nK = 1 in every band.
+bool printsNothing(const InkRow& row)
+{
+    for (int j = 0; j < kBands; ++j)
+        if (!(row.a[j] == 0.0 && row.n[j] == 1.0))
+            return false;
+    return true;
+}
+
+// Every area of the rows lies in [0, 1e100] and every 1 - a in [-1e100, 1]:
+// a product of three stays finite, so a product with a zero factor is zero.
+bool bounded(const double* a, const double* n, int count)
+{
+    for (int i = 0; i < count; ++i)
+        if (!(a[i] >= 0.0 && a[i] <= 1e100 && n[i] >= -1e100 && n[i] <= 1.0))
+            return false;
+    return true;
+}
+
+} // namespace
 
 GridEvaluator::GridEvaluator(MathProfile& profile) : inputs_(new Inputs), tables_(new Tables)
 {
@@ -297,6 +380,19 @@ void GridEvaluator::selectLimit(int limit)
             t.yellow3.n[j][l] = row.n[j];
         }
     }
+    t.threeColourWithoutBlack = printsNothing(t.black3);
+    for (int l = 0; l < kYellowLanes; ++l) {
+        bool inBounds = true, infinite = false;
+        for (int j = 0; j < kBands; ++j) {
+            inBounds = inBounds && bounded(&t.yellow3.a[j][l], &t.yellow3.n[j][l], 1);
+            infinite = infinite || t.yellow3.a[j][l] == HUGE_VAL;
+        }
+        t.yellow3Lane[l] = inBounds ? Tables::Lane::bounded : infinite ? Tables::Lane::infinite : Tables::Lane::other;
+    }
+    for (int i = 0; i < kCyanCount; ++i)
+        t.cyan3Bounded[i] = bounded(t.cyan3[i].a, t.cyan3[i].n, kBands);
+    for (int i = 0; i < kMagentaCount; ++i)
+        t.magenta3Bounded[i] = bounded(t.magenta3[i].a, t.magenta3[i].n, kBands);
     for (int l = 0; l < kBlackLanes; ++l) {
         const int factor = kBlackAxis.at(l < kBlackCount ? l : kBlackCount - 1);
         fillRow(row, inputs_->dot[1][3], exponent(1, 3, factor, percent));
@@ -310,7 +406,21 @@ void GridEvaluator::selectLimit(int limit)
 void GridEvaluator::threeColourSums(int cyan, int magenta, LaneSums<kYellowLanes>& out) const
 {
     const Tables& t = *tables_;
-    yellowLaneSums(inputs_->primaries, t.cyan3[cyan], t.magenta3[magenta], t.black3, t.yellow3, out);
+    if (!(t.threeColourWithoutBlack && t.cyan3Bounded[cyan] && t.magenta3Bounded[magenta])) {
+        yellowLaneSums(inputs_->primaries, t.cyan3[cyan], t.magenta3[magenta], t.black3, t.yellow3, out);
+        return;
+    }
+    yellowLaneSumsWithoutBlack(inputs_->primaries, t.cyan3[cyan], t.magenta3[magenta], t.yellow3, out);
+    for (int l = 0; l < kYellowLanes; ++l) {
+        if (t.yellow3Lane[l] == Tables::Lane::infinite) {
+            // aY = inf makes nY = -inf, and black's weight aK nC nM nY is
+            // 0 * -inf: the default NaN, which every later sum carries and
+            // fabs makes positive. X, Y and Z are that NaN.
+            out.X[l] = out.Y[l] = out.Z[l] = std::numeric_limits<double>::quiet_NaN();
+        } else if (t.yellow3Lane[l] == Tables::Lane::other) {
+            yellowLaneSum(inputs_->primaries, t.cyan3[cyan], t.magenta3[magenta], t.black3, t.yellow3, l, out);
+        }
+    }
 }
 
 void GridEvaluator::fourColourSums(int cyan, int magenta, int yellow, LaneSums<kBlackLanes>& out) const
@@ -352,6 +462,15 @@ bool profilesteps::scanGrayGridFast(MathProfile& profile, const lab& grey3, cons
                 for (int yi = 0; yi < kYellowAxis.count(); ++yi)
                     dE3[yi] = difference(grey3, sums3.X[yi], sums3.Y[yi], sums3.Z[yi]);
                 for (int yi = 0; yi < kYellowAxis.count(); ++yi) {
+                    // Every score of this block is sqrt(dE3^2 + dE4^2) with
+                    // dE4^2 >= 0, and rounded addition and sqrt never fall
+                    // when an operand grows: no black factor can score below
+                    // sqrt(dE3^2). When that cannot beat the best so far,
+                    // the block cannot change it. A NaN dE3 (the grey cannot
+                    // be printed at these factors) makes every score of the
+                    // block NaN, which never beats anything either.
+                    if (!(bestScore > std::sqrt(dE3[yi] * dE3[yi])))
+                        continue;
                     grid.fourColourSums(ci, mi, yi, sums4);
                     for (int ki = 0; ki < kBlackAxis.count(); ++ki) {
                         const double dE4 = difference(grey4, sums4.X[ki], sums4.Y[ki], sums4.Z[ki]);

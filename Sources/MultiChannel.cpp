@@ -16,7 +16,6 @@
 #include <cmath>
 #include <cstdint>
 #include <cstring>
-#include <set>
 #include <stdexcept>
 
 namespace {
@@ -24,108 +23,156 @@ namespace {
 template <size_t Columns>
 using Row = std::array<unsigned char, Columns>;
 
-template <size_t Columns>
-Row<Columns> rowWith(std::initializer_list<std::pair<int, int>> columnValues)
-{
-    Row<Columns> row{};
-    for (const auto& cv : columnValues)
-        row[static_cast<size_t>(cv.first)] = static_cast<unsigned char>(cv.second);
-    return row;
-}
+// Rows collected at compile time, in the order they are added.
+template <size_t Columns, size_t Capacity>
+struct RowList {
+    std::array<Row<Columns>, Capacity> rows{};
+    size_t size = 0;
+
+    constexpr void add(std::initializer_list<std::pair<int, int>> columnValues)
+    {
+        Row<Columns> row{};
+        for (const auto& cv : columnValues)
+            row[static_cast<size_t>(cv.first)] = static_cast<unsigned char>(cv.second);
+        rows[size++] = row;
+    }
+};
 
 // The rows of the six- and seven-colour charts. Each table is built by the
 // same rules: single-ink ramps 100..0, crossfades of the three chromatic inks,
 // black solid, all pairs at 100, all triples at 50, then ten black rows that
 // the charts do not print.
-template <size_t Columns, size_t Rows>
-std::array<Row<Columns>, Rows> buildChannelChart(std::initializer_list<int> rampColumns, bool fourColourMidGrey)
+template <size_t Columns, size_t Rows, size_t Ramps>
+constexpr RowList<Columns, Rows + 1> channelChart(const int (&rampColumns)[Ramps], bool fourColourMidGrey)
 {
-    std::vector<Row<Columns>> rows;
+    RowList<Columns, Rows + 1> list; // one row to spare, so that a rule adding one too many fails the assertion
     for (int column : rampColumns)
         for (int level = 100; level >= 0; level -= 10)
-            rows.push_back(rowWith<Columns>({{column, level}}));
+            list.add({{column, level}});
     const int crossfades[3][2] = {{0, 1}, {1, 2}, {2, 0}};
     for (const auto& pair : crossfades) {
         for (int k = 0; k <= 10; ++k)
-            rows.push_back(rowWith<Columns>({{pair[0], 10 * k}, {pair[1], 100 - 10 * k}}));
-        rows.push_back(rowWith<Columns>({{pair[0], 100}, {pair[1], 100}}));
+            list.add({{pair[0], 10 * k}, {pair[1], 100 - 10 * k}});
+        list.add({{pair[0], 100}, {pair[1], 100}});
     }
-    rows.push_back(rowWith<Columns>({{3, 100}}));
+    list.add({{3, 100}});
     const int n = static_cast<int>(Columns);
     for (int i = 0; i < n; ++i)
         for (int j = i + 1; j < n; ++j)
-            rows.push_back(rowWith<Columns>({{i, 100}, {j, 100}}));
+            list.add({{i, 100}, {j, 100}});
     for (int i = 0; i < n; ++i)
         for (int j = i + 1; j < n; ++j)
             for (int k = j + 1; k < n; ++k)
-                rows.push_back(rowWith<Columns>({{i, 50}, {j, 50}, {k, 50}}));
+                list.add({{i, 50}, {j, 50}, {k, 50}});
     if (fourColourMidGrey)
-        rows.push_back(rowWith<Columns>({{0, 50}, {1, 50}, {2, 50}, {3, 50}}));
+        list.add({{0, 50}, {1, 50}, {2, 50}, {3, 50}});
     for (int level = 90; level >= 0; level -= 10)
-        rows.push_back(rowWith<Columns>({{3, level}}));
+        list.add({{3, level}});
+    return list;
+}
 
+template <size_t Columns, size_t Rows, size_t Capacity>
+constexpr std::array<Row<Columns>, Rows> firstRows(const RowList<Columns, Capacity>& list)
+{
     std::array<Row<Columns>, Rows> table{};
-    if (rows.size() != Rows)
-        throw std::logic_error("multi-channel chart table has the wrong number of rows");
-    std::copy(rows.begin(), rows.end(), table.begin());
+    for (size_t i = 0; i < Rows; ++i)
+        table[i] = list.rows[i];
     return table;
 }
 
+constexpr int kSixRamps[] = {0, 1, 4, 2, 5}, kSevenRamps[] = {0, 6, 1, 4, 2, 5};
+constexpr auto kSixColourRows = channelChart<6, 138>(kSixRamps, true);
+constexpr auto kSevenColourRows = channelChart<7, 169>(kSevenRamps, false);
+static_assert(kSixColourRows.size == 138 && kSevenColourRows.size == 169, "the multi-channel charts' rows");
+
 // The extended C, M, Y, K set: the union of grids and ramps below, each
 // combination once, in ascending (C, M, Y, K) order; 3499 rows, then one
-// unused all-zero row.
-std::array<Row<4>, 3500> buildExtendedSet()
-{
-    std::set<Row<4>> combinations;
-    auto add = [&](int c, int m, int y, int k) {
-        combinations.insert(Row<4>{static_cast<unsigned char>(c), static_cast<unsigned char>(m),
-                                   static_cast<unsigned char>(y), static_cast<unsigned char>(k)});
-    };
-    auto grid = [&](const std::vector<int>& blacks, const std::vector<int>& levels) {
+// unused all-zero row. Built at compile time: every combination added as the
+// key C M Y K (one byte each, C highest), the keys sorted, repeats dropped.
+constexpr size_t kExtendedAdds = 3915; // A 1331, B 729, C 1296, D 250, E 64, F 27, G 81, H 16, I 84, J 37
+
+struct ExtendedKeys {
+    std::array<std::uint32_t, kExtendedAdds> keys{};
+    size_t size = 0;
+
+    constexpr void add(int c, int m, int y, int k)
+    {
+        keys[size++] = static_cast<std::uint32_t>(c) << 24 | static_cast<std::uint32_t>(m) << 16 |
+                       static_cast<std::uint32_t>(y) << 8 | static_cast<std::uint32_t>(k);
+    }
+    template <size_t Blacks, size_t Levels>
+    constexpr void grid(const int (&blacks)[Blacks], const int (&levels)[Levels])
+    {
         for (int k : blacks)
             for (int c : levels)
                 for (int m : levels)
                     for (int y : levels)
                         add(c, m, y, k);
-    };
-    grid({0}, {0, 10, 20, 30, 40, 50, 60, 70, 80, 90, 100});                 // A
-    grid({0}, {0, 10, 20, 30, 40, 55, 70, 85, 100});                         // B
-    grid({10, 20, 30, 50, 70, 90}, {0, 10, 20, 40, 70, 100});                // C
-    grid({40, 60}, {0, 20, 40, 70, 100});                                    // D
-    grid({80}, {0, 40, 70, 100});                                            // E
-    grid({100}, {0, 40, 100});                                               // F
-    grid({0, 3, 40}, {0, 3, 40});                                            // G
-    grid({0, 7}, {0, 7});                                                    // H
+    }
+};
+
+constexpr ExtendedKeys extendedKeys()
+{
+    ExtendedKeys set;
+    set.grid({0}, {0, 10, 20, 30, 40, 50, 60, 70, 80, 90, 100});  // A
+    set.grid({0}, {0, 10, 20, 30, 40, 55, 70, 85, 100});          // B
+    set.grid({10, 20, 30, 50, 70, 90}, {0, 10, 20, 40, 70, 100}); // C
+    set.grid({40, 60}, {0, 20, 40, 70, 100});                     // D
+    set.grid({80}, {0, 40, 70, 100});                             // E
+    set.grid({100}, {0, 40, 100});                                // F
+    set.grid({0, 3, 40}, {0, 3, 40});                             // G
+    set.grid({0, 7}, {0, 7});                                     // H
     for (int level : {0, 2, 3, 5, 7, 10, 15, 20, 25, 30, 40, 50, 60, 70, 75, 80, 85, 90, 95, 98, 100}) {
-        add(level, 0, 0, 0);                                                 // I
-        add(0, level, 0, 0);
-        add(0, 0, level, 0);
-        add(0, 0, 0, level);
+        set.add(level, 0, 0, 0); // I
+        set.add(0, level, 0, 0);
+        set.add(0, 0, level, 0);
+        set.add(0, 0, 0, level);
     }
     // J: grey-balanced three-colour steps, with black from step 2 on.
     const int greySteps[7][3] = {{5, 3, 3}, {10, 6, 6}, {20, 12, 12}, {40, 27, 27},
                                  {60, 45, 45}, {80, 65, 65}, {100, 85, 85}};
-    const struct {
-        int k, first, last; // steps first..last (indices into greySteps)
-    } blackRuns[] = {{0, 0, 6}, {10, 1, 3}, {20, 1, 4}, {40, 1, 5}, {60, 1, 6}, {80, 1, 6}, {100, 1, 6}};
-    for (const auto& run : blackRuns)
-        for (int s = run.first; s <= run.last; ++s)
-            add(greySteps[s][0], greySteps[s][1], greySteps[s][2], run.k);
+    const int blackRuns[7][3] = {{0, 0, 6}, {10, 1, 3}, {20, 1, 4}, {40, 1, 5}, {60, 1, 6}, {80, 1, 6}, {100, 1, 6}};
+    for (const auto& run : blackRuns) // black, steps first..last (indices into greySteps)
+        for (int s = run[1]; s <= run[2]; ++s)
+            set.add(greySteps[s][0], greySteps[s][1], greySteps[s][2], run[0]);
+    // Shell sort (Ciura's gaps), then each key once.
+    const size_t gaps[] = {701, 301, 132, 57, 23, 10, 4, 1};
+    for (size_t gap : gaps)
+        for (size_t i = gap; i < set.size; ++i) {
+            const std::uint32_t key = set.keys[i];
+            size_t j = i;
+            for (; j >= gap && set.keys[j - gap] > key; j -= gap)
+                set.keys[j] = set.keys[j - gap];
+            set.keys[j] = key;
+        }
+    size_t unique = 0;
+    for (size_t i = 0; i < set.size; ++i)
+        if (unique == 0 || set.keys[unique - 1] != set.keys[i])
+            set.keys[unique++] = set.keys[i];
+    set.size = unique;
+    return set;
+}
 
+constexpr ExtendedKeys kExtendedKeys = extendedKeys();
+static_assert(kExtendedKeys.size == 3499, "the extended C, M, Y, K set holds 3499 combinations");
+
+constexpr std::array<Row<4>, 3500> extendedSet()
+{
     std::array<Row<4>, 3500> table{};
-    if (combinations.size() != 3499)
-        throw std::logic_error("extended CMYK set must hold 3499 combinations");
-    std::copy(combinations.begin(), combinations.end(), table.begin());
+    for (size_t i = 0; i < kExtendedKeys.size; ++i)
+        for (size_t c = 0; c < 4; ++c)
+            table[i][c] = static_cast<unsigned char>(kExtendedKeys.keys[i] >> (24 - 8 * c));
     return table; // row 3499 stays all zero
 }
 
 } // namespace
 
+// Constant-initialised: nothing of these tables is built when the library loads.
 const std::array<std::array<unsigned char, 6>, 138> MathProfile::toBeCalculatedCLR6 =
-    buildChannelChart<6, 138>({0, 1, 4, 2, 5}, true);
+    firstRows<6, 138>(kSixColourRows);
 const std::array<std::array<unsigned char, 7>, 169> MathProfile::toBeCalculatedCLR7 =
-    buildChannelChart<7, 169>({0, 6, 1, 4, 2, 5}, false);
-const std::array<std::array<unsigned char, 4>, 3500> MathProfile::ZANExtended = buildExtendedSet();
+    firstRows<7, 169>(kSevenColourRows);
+const std::array<std::array<unsigned char, 4>, 3500> MathProfile::ZANExtended = extendedSet();
 
 void MathProfile::buildTintRamps()
 {
@@ -207,8 +254,7 @@ double hostCoverage(int u)
 
 void MathProfile::calculateChartMCH(double** rows, PrintProcess process, const char* path, int* measurements)
 {
-    std::ofstream stream;
-    chartfile::open(stream, path);
+    chartfile::ChartStream stream(path);
     ColorPatch& sample = patchSlots[kSlotCurrentSample];
 
     if (process == VM_PROCESS_SIX_COLOUR || process == VM_PROCESS_SEVEN_COLOUR) {
@@ -227,15 +273,15 @@ void MathProfile::calculateChartMCH(double** rows, PrintProcess process, const c
 
         const int sets = six ? 128 : 159;
         stream << "IT8.7\r\nTARGET_ID\t\"" << (six ? "5.11" : "7.11") << "\"\r\nTARGET\r\nLAYOUT_ID\r\nNUMBER_OF_SETS\t"
-               << sets << std::endl;
-        stream << "NUMBER_OF_FIELDS\t" << 43 << std::endl;
-        stream << "BEGIN_DATA_FORMAT" << std::endl;
+               << sets << chartfile::endl;
+        stream << "NUMBER_OF_FIELDS\t" << 43 << chartfile::endl;
+        stream << "BEGIN_DATA_FORMAT" << chartfile::endl;
         stream << "CMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K\tRGB_R\tRGB_G\tRGB_B\t";
         for (int nm = 380; nm <= 730; nm += 10)
             stream << "SPECTRAL_" << nm << '\t';
-        stream << std::endl;
-        stream << "END_DATA_FORMAT" << std::endl;
-        stream << "BEGIN_DATA" << std::endl;
+        stream << chartfile::endl;
+        stream << "END_DATA_FORMAT" << chartfile::endl;
+        stream << "BEGIN_DATA" << chartfile::endl;
 
         buildTintRamps();
         for (int r = 0; r < sets; ++r) {
@@ -251,7 +297,7 @@ void MathProfile::calculateChartMCH(double** rows, PrintProcess process, const c
                 stream << value << '\t';
             for (double value : sample.spectrum)
                 stream << value << '\t';
-            stream << std::endl;
+            stream << chartfile::endl;
         }
         // Hand the extended C, M, Y, K set to the host; ints 7i+4..7i+6 stay.
         for (int i = 0; i < VM_EXCHANGE_RECORDS; ++i)
@@ -273,5 +319,5 @@ void MathProfile::calculateChartMCH(double** rows, PrintProcess process, const c
             chartfile::writeXYZLine(stream, i + 1, sample.channel, sample.XYZ);
         }
     }
-    chartfile::finish(stream);
+    stream.finish();
 }

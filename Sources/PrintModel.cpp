@@ -7,6 +7,7 @@
 // models/FourColourKernels.cpp.
 #include "MathProfile.h"
 #include "ProfileSteps.h"
+#include "models/InkAreaMemo.h"
 #include "models/FourColourKernels.h"
 
 #include <cmath>
@@ -55,17 +56,25 @@ MathProfile::ColorPatch& profilesteps::solidOf(MathProfile& profile, int ink)
 
 void MathProfile::calcOffsetSample()
 {
+    profilesteps::calcOffsetSample(*this, nullptr);
+}
+
+void profilesteps::calcOffsetSample(MathProfile& profile, veltmarquist::models::InkAreaMemo* memo)
+{
     using namespace veltmarquist::models;
-    ColorPatch& sample = patchSlots[kSlotCurrentSample];
+    ColorPatch* patchSlots = profile.patchSlots;
+    const double* grayDiffFactor = profile.grayDiffFactor;
+    const double coverageLimit = profile.coverageLimit;
+    ColorPatch& sample = patchSlots[MathProfile::kSlotCurrentSample];
     const double* coverage = sample.channel; // C, M, Y, K
     double others[4], exponent[4];
     otherCoverages(coverage, others);
     for (int x = 0; x < 4; ++x)
         exponent[x] = offsetExponent(grayDiffFactor[x], others[x], coverage[x], coverageLimit);
 
-    ColorPatch& paper = patchSlots[kSlotPaper];
-    ColorPatch* primary[kOffsetPrimaries] = {&profilesteps::solidOf(*this, 0), &profilesteps::solidOf(*this, 1),
-                                             &profilesteps::solidOf(*this, 2), &profilesteps::solidOf(*this, 3)};
+    ColorPatch& paper = patchSlots[MathProfile::kSlotPaper];
+    ColorPatch* primary[kOffsetPrimaries] = {&solidOf(profile, 0), &solidOf(profile, 1), &solidOf(profile, 2),
+                                             &solidOf(profile, 3)};
     for (int s = 0; s <= 10; ++s)
         primary[4 + s] = &patchSlots[s];
     primary[kPaperPrimary] = &paper;
@@ -74,7 +83,8 @@ void MathProfile::calcOffsetSample()
     const double* dots[4];
     for (int x = 0; x < 4; ++x) {
         for (int j = 0; j < kBands; ++j)
-            dot[x][j] = dotArea(patchSlots[kSlotFirstTint + x].spectrum[j], primary[x]->spectrum[j], paper.spectrum[j]);
+            dot[x][j] = dotArea(patchSlots[MathProfile::kSlotFirstTint + x].spectrum[j], primary[x]->spectrum[j],
+                                paper.spectrum[j]);
         dots[x] = dot[x];
     }
     const double* spectra[kOffsetPrimaries];
@@ -83,8 +93,15 @@ void MathProfile::calcOffsetSample()
         spectra[p] = primary[p]->spectrum;
         weights[p] = primary[p]->weight;
     }
-    offsetSpectrum(spectra, dots, exponent, sample.spectrum, weights);
-    spec2XYZ(&sample);
+    if (memo) {
+        const double* areas[4];
+        for (int x = 0; x < 4; ++x)
+            areas[x] = memo->areas(dots[x], exponent[x]);
+        offsetSpectrumFromAreas(spectra, areas, sample.spectrum, weights);
+    } else {
+        offsetSpectrum(spectra, dots, exponent, sample.spectrum, weights);
+    }
+    profile.spec2XYZ(&sample);
 }
 
 void profilesteps::calcGravureSample(MathProfile& profile, int i1, int i2, int i3, int i4)

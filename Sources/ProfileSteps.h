@@ -6,6 +6,10 @@
 
 #include "MathProfile.h"
 
+namespace veltmarquist::models {
+class InkAreaMemo;
+}
+
 namespace profilesteps {
 
 using ColorPatch = MathProfile::ColorPatch;
@@ -21,8 +25,11 @@ ColorPatch& solidOf(MathProfile& profile, int ink);
 void calcGravureSample(MathProfile& profile, int i1, int i2, int i3, int i4);
 // Runs the gravure method that an ink order selects (as inkOrder does).
 void calcGravureSampleByOrder(MathProfile& profile, int order);
+// The offset model for the current sample, as calcOffsetSample; with a memo,
+// its d^e rows come from there (the same bits).
+void calcOffsetSample(MathProfile& profile, veltmarquist::models::InkAreaMemo* memo);
 // The model of a four-colour process: 1 gravure in inkOrder, else offset.
-void predictFourColour(MathProfile& profile, PrintProcess process);
+void predictFourColour(MathProfile& profile, PrintProcess process, veltmarquist::models::InkAreaMemo* memo = nullptr);
 
 // CIELAB of a patch's X, Y, Z (divided by 100 first).
 lab labOf(MathProfile& profile, const ColorPatch& patch);
@@ -33,7 +40,9 @@ double deltaE(const lab& first, const lab& second);
 void fitGrayDiffFactor(MathProfile& profile, double** rows, bool straightforward);
 // Score of one point (pC, pM, pY, pK, pL) of the grey fit against the
 // measured greys: sets the fields and predicts both greys.
-double scoreGrayPoint(MathProfile& profile, const lab& grey3, const lab& grey4, const int point[5]);
+// With a memo, the d^e rows come from there (the same bits).
+double scoreGrayPoint(MathProfile& profile, const lab& grey3, const lab& grey4, const int point[5],
+                      veltmarquist::models::InkAreaMemo* memo = nullptr);
 // The coarse grid of the grey fit, every point through scoreGrayPoint.
 // Improves on the best point and score passed in (a tie keeps the earlier).
 void scanGrayGridStraightforward(MathProfile& profile, const lab& grey3, const lab& grey4, int bestPoint[5],

@@ -1,7 +1,9 @@
 // Whole CalculateChart jobs on the golden inputs: the default job (process 0)
 // with the fast grey fit and with the straightforward one, the multi-channel
-// sequence 3 -> 6, and the chart conversions 7 to 9. After the run the ratio
-// of the two process-0 variants is printed, both measured in the same run.
+// sequence 3 -> 6, and the chart conversions 7 to 9; processes 0 and 1 as
+// whole processes against the library's literal build. After the run the
+// ratios of the fast and the plain variants are printed, both measured in
+// the same run.
 #include "TestSupport.h"
 
 #include "RatioReporter.h"
@@ -12,6 +14,8 @@
 #include <map>
 #include <sstream>
 #include <string>
+#include <spawn.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 using namespace testsupport;
@@ -119,6 +123,55 @@ void ChartConversion(benchmark::State& state)
 }
 BENCHMARK(ChartConversion)->DenseRange(7, 9)->Unit(benchmark::kMicrosecond);
 
+// A whole process per iteration, start-up and library load included: the
+// driver reads the golden block and runs one job, linked against the library
+// or against its literal build (every job on its plain reference path). Both
+// drivers are one source built with the same compiler and flags; the charts
+// they write are compared after the run.
+void wholeProcess(benchmark::State& state, const char* driver, int process, const char* input, const char* golden)
+{
+    TempDir dir;
+    const std::string block = goldenPath(input), chart = dir.path("chart.txt"), number = std::to_string(process);
+    bool ran = true;
+    for (auto _ : state) {
+        const char* argv[] = {driver, block.c_str(), number.c_str(), chart.c_str(), nullptr};
+        pid_t child = 0;
+        int status = 0;
+        if (posix_spawn(&child, driver, nullptr, nullptr, const_cast<char* const*>(argv), environ) != 0 ||
+            waitpid(child, &status, 0) != child || !WIFEXITED(status) || WEXITSTATUS(status) != 0) {
+            state.SkipWithError((std::string(driver) + " failed").c_str());
+            ran = false;
+            break;
+        }
+    }
+    if (ran && readFile(chart) != readFile(goldenPath(golden)))
+        state.SkipWithError("the chart differs from the golden chart");
+}
+
+void Process0_WholeProcess(benchmark::State& state)
+{
+    wholeProcess(state, VELTMARQUIST_PROCESS_DRIVER, VM_PROCESS_OFFSET, "offset-form.in", "offset-form.p0.chart");
+}
+BENCHMARK(Process0_WholeProcess)->Unit(benchmark::kMillisecond)->UseRealTime();
+
+void Process0_WholeProcessLiteral(benchmark::State& state)
+{
+    wholeProcess(state, VELTMARQUIST_LITERAL_DRIVER, VM_PROCESS_OFFSET, "offset-form.in", "offset-form.p0.chart");
+}
+BENCHMARK(Process0_WholeProcessLiteral)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(6.0);
+
+void Process1_WholeProcess(benchmark::State& state)
+{
+    wholeProcess(state, VELTMARQUIST_PROCESS_DRIVER, VM_PROCESS_GRAVURE, "offset-form.in", "offset-form.p1.chart");
+}
+BENCHMARK(Process1_WholeProcess)->Unit(benchmark::kMillisecond)->UseRealTime();
+
+void Process1_WholeProcessLiteral(benchmark::State& state)
+{
+    wholeProcess(state, VELTMARQUIST_LITERAL_DRIVER, VM_PROCESS_GRAVURE, "offset-form.in", "offset-form.p1.chart");
+}
+BENCHMARK(Process1_WholeProcessLiteral)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(6.0);
+
 } // namespace
 
 int main(int argc, char** argv)
@@ -130,6 +183,8 @@ int main(int argc, char** argv)
     benchmark::RunSpecifiedBenchmarks(&reporter);
     reporter.printRatio("Process0_Members/straightforward", "Process0_Members/fast");
     reporter.printRatio("Process0_Members/straightforward", "Process0_CalculateChart");
+    reporter.printRatio("Process0_WholeProcessLiteral", "Process0_WholeProcess", false);
+    reporter.printRatio("Process1_WholeProcessLiteral", "Process1_WholeProcess", false);
     benchmark::Shutdown();
     return 0;
 }

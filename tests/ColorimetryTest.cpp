@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <charconv>
 #include <cmath>
 
 using ::testing::AnyOf;
@@ -55,6 +56,15 @@ TEST(Colorimetry, CubeRootTableTellingRows)
         }
     }
     EXPECT_EQ(found, std::vector<int>(std::begin(differing), std::end(differing)));
+    // The compile-time table is the rule's: cbrt in long double, nine decimals as text, read back as a float.
+    for (int i = 0; i <= 1024; ++i) {
+        char text[32];
+        const auto printed = std::to_chars(text, text + sizeof text, std::cbrt(static_cast<long double>(i) / 1024.0L),
+                                           std::chars_format::fixed, 9);
+        float value = 0.0f;
+        std::from_chars(text, printed.ptr, value, std::chars_format::fixed);
+        EXPECT_EQ(table[static_cast<size_t>(i)], value) << i;
+    }
 }
 
 TEST(Colorimetry, CompandingBreakPoints)

@@ -2,11 +2,13 @@
 // leave the same fields, the same profile state (slots, weights, tint lists)
 // and, through it, the same chart bytes.
 #include "GrayFitFastPath.h"
+#include "ProfileSteps.h"
 #include "TestSupport.h"
 
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <cmath>
 #include <cstring>
 #include <iomanip>
 #include <limits>
@@ -204,5 +206,42 @@ TEST(GrayFitFastPath, TiedAndUnscorableForms)
     const auto unscored = expectSameFit(nanPaper, "NaN paper band");
     for (int x = 0; x < 4; ++x)
         EXPECT_EQ(unscored->profile.grayDiffFactor[x], 0.0) << "ink " << x;
+    EXPECT_EQ(unscored->profile.coverageLimit, 200.0);
+}
+
+TEST(GrayFitFastPath, FormsWhereTheGridsBoundCouldMislead)
+{
+    // The fast grid skips a block of black factors when the three-colour
+    // grey alone cannot beat the best score. Greys measured far from what
+    // the model can print keep every score high (the best near 20 dE), so
+    // few blocks are skipped and near-ties decide; a NaN in a measured grey
+    // makes every score NaN, every block is skipped, and the fit must fall
+    // back exactly as the point-by-point loop does.
+    Form farGreys = syntheticForm(0);
+    farGreys[44] = farGreys[0]; // the cyan solid measured for C40 M40 Y40
+    for (double& value : farGreys[45])
+        value *= 0.35; // and C40 M40 Y40 K40 far darker
+    const auto far = expectSameFit(farGreys, "greys far from the model");
+    {
+        MathProfile profile("score");
+        RowTable rows(farGreys);
+        profile.calculateGrayDiffFactor(rows.rows());
+        auto measured = [&profile](const std::vector<double>& row) {
+            MathProfile::ColorPatch patch = {};
+            std::copy(row.begin(), row.end(), patch.spectrum);
+            profile.spec2XYZ(&patch);
+            return profilesteps::labOf(profile, patch);
+        };
+        const int point[5] = {int(std::lround(profile.grayDiffFactor[0] * 100)),
+                              int(std::lround(profile.grayDiffFactor[1] * 100)),
+                              int(std::lround(profile.grayDiffFactor[2] * 100)),
+                              int(std::lround(profile.grayDiffFactor[3] * 100)), int(profile.coverageLimit)};
+        const double best = profilesteps::scoreGrayPoint(profile, measured(farGreys[44]), measured(farGreys[45]), point);
+        EXPECT_GT(best, 8.0) << "the greys are meant to fit badly";
+    }
+
+    Form nanGrey = syntheticForm(1);
+    nanGrey[45][7] = std::numeric_limits<double>::quiet_NaN();
+    const auto unscored = expectSameFit(nanGrey, "NaN in the four-colour grey");
     EXPECT_EQ(unscored->profile.coverageLimit, 200.0);
 }

@@ -21,18 +21,6 @@
 namespace veltmarquist {
 namespace models {
 
-double dotArea(double tint, double solid, double paper)
-{
-    if (solid == paper)
-        return 0.0;
-    const double d = (tint - paper) / (solid - paper);
-    if (d > 1.0)
-        return 1.0;
-    if (d < 0.0)
-        return 0.0;
-    return d;
-}
-
 void otherCoverages(const double cmyk[4], double others[4])
 {
     const double c = cmyk[0], m = cmyk[1], y = cmyk[2], k = cmyk[3];
@@ -48,14 +36,17 @@ double offsetExponent(double factor, double others, double coverage, double limi
     return 1.0 - factor * std::sqrt(q * (coverage / 100.0));
 }
 
-void offsetSpectrum(const double* const primary[kOffsetPrimaries], const double* const dot[4],
-                    const double exponent[4], double* spectrum, double* const* weight)
+void inkAreas(const double* dot, double exponent, double* area)
+{
+    for (int j = 0; j < kBands; ++j)
+        area[j] = std::pow(dot[j], exponent);
+}
+
+void offsetSpectrumFromAreas(const double* const primary[kOffsetPrimaries], const double* const area[4],
+                             double* spectrum, double* const* weight)
 {
     for (int j = 0; j < kBands; ++j) {
-        double a[4];
-        for (int x = 0; x < 4; ++x)
-            a[x] = std::pow(dot[x][j], exponent[x]);
-        const double aC = a[0], aM = a[1], aY = a[2], aK = a[3];
+        const double aC = area[0][j], aM = area[1][j], aY = area[2][j], aK = area[3][j];
         const double nC = 1.0 - aC, nM = 1.0 - aM, nY = 1.0 - aY, nK = 1.0 - aK;
 
         // Demichel weights in primary order, each product formed left to right.
@@ -85,6 +76,16 @@ void offsetSpectrum(const double* const primary[kOffsetPrimaries], const double*
         }
         spectrum[j] = std::fabs(R);
     }
+}
+
+void offsetSpectrum(const double* const primary[kOffsetPrimaries], const double* const dot[4],
+                    const double exponent[4], double* spectrum, double* const* weight)
+{
+    double area[4][kBands];
+    for (int x = 0; x < 4; ++x)
+        inkAreas(dot[x], exponent[x], area[x]);
+    const double* const areas[4] = {area[0], area[1], area[2], area[3]};
+    offsetSpectrumFromAreas(primary, areas, spectrum, weight);
 }
 
 const InkOrder& gravureInkOrder(int inkOrder)

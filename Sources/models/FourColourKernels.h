@@ -15,7 +15,17 @@ namespace models {
 
 // Murray-Davies dot area (tint - paper) / (solid - paper), clamped to [0, 1];
 // 0 where the solid equals the paper.
-double dotArea(double tint, double solid, double paper);
+inline double dotArea(double tint, double solid, double paper)
+{
+    if (solid == paper)
+        return 0.0;
+    const double d = (tint - paper) / (solid - paper);
+    if (d > 1.0)
+        return 1.0;
+    if (d < 0.0)
+        return 0.0;
+    return d;
+}
 
 // For each of C, M, Y, K the sum of the other three coverages, each sum formed
 // in the order the model has always formed it.
@@ -39,6 +49,11 @@ constexpr unsigned char kOffsetPrimaryMask[kOffsetPrimaries] = {1, 2, 4, 8, 6, 5
 // order (a primary that stands twice keeps the later weight).
 void offsetSpectrum(const double* const primary[kOffsetPrimaries], const double* const dot[4],
                     const double exponent[4], double* spectrum, double* const* weight);
+// The two steps of offsetSpectrum: an ink's effective dot areas a = dot^exponent,
+// then the spectrum from the four inks' areas.
+void inkAreas(const double* dot, double exponent, double* area);
+void offsetSpectrumFromAreas(const double* const primary[kOffsetPrimaries], const double* const area[4],
+                             double* spectrum, double* const* weight);
 
 // -- Gravure model ------------------------------------------------------------------
 
