@@ -1,41 +1,17 @@
 // Reading a large measurement file: time, and the heap's peak against the
 // file's size. The file (about 200 MB: SAMPLE_ID, CMYK and 36 bands of 0-1
 // reflectance with four decimals) is generated once in a temporary folder.
+#include "HeapPeak.h"
 #include "MeasurementFile.h"
 
 #include <benchmark/benchmark.h>
 
-#include <malloc.h>
-
-#include <atomic>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
-#include <new>
 #include <string>
 
 namespace {
-
-std::atomic<long long> heapNow{0}, heapPeak{0};
-
-void* allocate(std::size_t size)
-{
-    void* pointer = std::malloc(size == 0 ? 1 : size);
-    if (pointer == nullptr)
-        throw std::bad_alloc();
-    const long long now = heapNow += static_cast<long long>(malloc_usable_size(pointer));
-    for (long long peak = heapPeak; now > peak && !heapPeak.compare_exchange_weak(peak, now);) {
-    }
-    return pointer;
-}
-
-void release(void* pointer)
-{
-    if (pointer == nullptr)
-        return;
-    heapNow -= static_cast<long long>(malloc_usable_size(pointer));
-    std::free(pointer);
-}
 
 // About `bytes` of measurement file; returns its path.
 std::string largeFile(long long bytes)
@@ -76,13 +52,12 @@ void ReadLargeFile(benchmark::State& state)
     const double fileBytes = static_cast<double>(std::filesystem::file_size(path));
     size_t sets = 0;
     for (auto _ : state) {
-        heapPeak = heapNow.load();
-        const long long before = heapNow;
+        const long long before = heappeak::startPeak();
         const veltmarquist::ReadResult result = veltmarquist::readMeasurementFile(path);
         if (!result.ok())
             state.SkipWithError(result.error.describe().c_str());
         sets = result.ok() ? result.file->sets.size() : 0;
-        state.counters["peak_heap_per_file_byte"] = static_cast<double>(heapPeak - before) / fileBytes;
+        state.counters["peak_heap_per_file_byte"] = static_cast<double>(heappeak::heapPeak - before) / fileBytes;
     }
     state.counters["file_MB"] = fileBytes / 1e6;
     state.counters["sets"] = static_cast<double>(sets);
@@ -91,30 +66,5 @@ void ReadLargeFile(benchmark::State& state)
 BENCHMARK(ReadLargeFile)->Unit(benchmark::kMillisecond)->Iterations(3);
 
 } // namespace
-
-void* operator new(std::size_t size)
-{
-    return allocate(size);
-}
-void* operator new[](std::size_t size)
-{
-    return allocate(size);
-}
-void operator delete(void* pointer) noexcept
-{
-    release(pointer);
-}
-void operator delete[](void* pointer) noexcept
-{
-    release(pointer);
-}
-void operator delete(void* pointer, std::size_t) noexcept
-{
-    release(pointer);
-}
-void operator delete[](void* pointer, std::size_t) noexcept
-{
-    release(pointer);
-}
 
 BENCHMARK_MAIN();

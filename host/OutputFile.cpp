@@ -451,6 +451,15 @@ void PendingOutput::writeBytes(const std::string& bytes)
         throw HostError(Failure::OutputUnwritable, name() + ": write failed (disk full?)");
 }
 
+void PendingOutput::writeStreamed(const std::function<void(std::ostream&)>& produce)
+{
+    std::ofstream out(temporary_, std::ios::binary | std::ios::trunc);
+    produce(out);
+    out.close();
+    if (!out)
+        throw HostError(Failure::OutputUnwritable, name() + ": write failed (disk full?)");
+}
+
 void PendingOutput::checkChart() const
 {
     std::ifstream in(temporary_, std::ios::binary);

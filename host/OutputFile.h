@@ -4,6 +4,8 @@
 #define VELTMARQUIST_TOOL_OUTPUTFILE_H
 
 #include <cstddef>
+#include <functional>
+#include <ostream>
 #include <string>
 #include <vector>
 
@@ -66,6 +68,10 @@ public:
     void write(const std::string& text);
     // Writes a binary file (an ICC profile) to the temporary file as it is.
     void writeBytes(const std::string& bytes);
+    // Writes what `produce` streams into the temporary file, for text too
+    // large to hold (a chart export, which checks its numbers before it
+    // formats them). A throw from `produce` leaves the target untouched.
+    void writeStreamed(const std::function<void(std::ostream&)>& produce);
     // Checks the library's chart in the temporary file: it ends with
     // "END_DATA" and a newline (the library does not see write errors such
     // as a full disk, so they surface here), and every value of its data is

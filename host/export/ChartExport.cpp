@@ -14,6 +14,7 @@
 #include <cstdlib>
 #include <ctime>
 #include <set>
+#include <sstream>
 
 namespace veltmarquist::exporting {
 
@@ -170,13 +171,18 @@ void requireFinite(const double* values, int count, const PatchLayout& layout, s
                               "the model predicted a value that is not a number for " + layout.describePatch(patch));
 }
 
-void appendNumbers(std::vector<std::string>& row, const double* values, int count, const PatchLayout& layout,
-                   std::size_t patch)
+void appendNumbers(std::string& line, const double* values, int count, const PatchLayout& layout, std::size_t patch)
 {
     requireFinite(values, count, layout, patch);
-    for (int i = 0; i < count; ++i)
-        row.push_back(roundTripText(values[i]));
+    for (int i = 0; i < count; ++i) {
+        line += '\t';
+        line += roundTripText(values[i]);
+    }
 }
+
+// Patches predicted and written per step: memory stays that of one batch
+// whatever the layout's size.
+constexpr std::size_t kBatch = 2048;
 
 // The library's own XYZ chart of the layout's patches, numbered from 1 (a
 // file layout's SAMPLE_IDs do not survive: the format has no place for them),
@@ -242,48 +248,60 @@ void checkOptions(const ExportOptions& options)
                                             roundTripText(*options.inkLimit));
 }
 
-std::string exportChart(const PrintModel& model, const FormProvenance& form, const PatchLayout& layout,
-                        const ExportOptions& options)
+void exportChart(const PrintModel& model, const FormProvenance& form, const PatchLayout& layout,
+                 const ExportOptions& options, std::ostream& out)
 {
     checkOptions(options);
     checkPredictable(layout, model);
 
-    if (options.format == ChartFormat::library)
-        return libraryChartText(model, layout);
+    if (options.format == ChartFormat::library) {
+        out << libraryChartText(model, layout);
+        return;
+    }
 
     const std::size_t count = layout.size();
-    std::vector<double> spectra(options.spectral ? count * kSpectrumBands : 0), XYZ(count * 3);
-    model.predict(count, layout.cmyk.data(), options.spectral ? spectra.data() : nullptr, XYZ.data(), nullptr);
-
-    cgats::Document document;
-    document.sheetType = options.format == ChartFormat::cti3 ? "CTI3" : "CGATS.17";
     KeywordList header;
     addHeader(header, model, form, layout, options);
-    document.keywords = header.take();
-    document.fields = fieldsOf(options);
-    document.rows.reserve(count);
-    for (std::size_t patch = 0; patch < count; ++patch) {
-        std::vector<std::string> row;
-        row.reserve(document.fields.size());
-        row.push_back(layout.ids[patch]);
-        appendNumbers(row, &layout.cmyk[4 * patch], 4, layout, patch);
-        const double* xyz = &XYZ[3 * patch];
-        appendNumbers(row, xyz, 3, layout, patch);
-        // The exact CIELAB of the X, Y, Z just written; the library's
-        // tabulated cube root belongs to its own charts.
-        const Lab exact = labOfXYZ({xyz[0], xyz[1], xyz[2]});
-        const double lab[3] = {exact.L, exact.a, exact.b};
-        appendNumbers(row, lab, 3, layout, patch);
-        if (options.spectral) {
-            double* bands = &spectra[kSpectrumBands * patch];
-            if (options.format == ChartFormat::cti3)
-                for (int band = 0; band < kSpectrumBands; ++band)
-                    bands[band] *= 100.0;
-            appendNumbers(row, bands, kSpectrumBands, layout, patch);
+    out << cgats::headerText(options.format == ChartFormat::cti3 ? "CTI3" : "CGATS.17", header.take(),
+                             fieldsOf(options), count);
+    std::vector<double> spectra(options.spectral ? kBatch * kSpectrumBands : 0), XYZ(kBatch * 3);
+    std::string text;
+    for (std::size_t first = 0; first < count; first += kBatch) {
+        const std::size_t size = std::min(kBatch, count - first);
+        model.predict(size, &layout.cmyk[4 * first], options.spectral ? spectra.data() : nullptr, XYZ.data(),
+                      nullptr);
+        text.clear();
+        for (std::size_t i = 0; i < size; ++i) {
+            const std::size_t patch = first + i;
+            cgats::appendCell(text, layout.ids[patch], true);
+            appendNumbers(text, &layout.cmyk[4 * patch], 4, layout, patch);
+            const double* xyz = &XYZ[3 * i];
+            appendNumbers(text, xyz, 3, layout, patch);
+            // The exact CIELAB of the X, Y, Z just written; the library's
+            // tabulated cube root belongs to its own charts.
+            const Lab exact = labOfXYZ({xyz[0], xyz[1], xyz[2]});
+            const double lab[3] = {exact.L, exact.a, exact.b};
+            appendNumbers(text, lab, 3, layout, patch);
+            if (options.spectral) {
+                double* bands = &spectra[kSpectrumBands * i];
+                if (options.format == ChartFormat::cti3)
+                    for (int band = 0; band < kSpectrumBands; ++band)
+                        bands[band] *= 100.0;
+                appendNumbers(text, bands, kSpectrumBands, layout, patch);
+            }
+            text += '\n';
         }
-        document.rows.push_back(std::move(row));
+        out << text;
     }
-    return cgats::write(document);
+    out << cgats::kEndText;
+}
+
+std::string exportChart(const PrintModel& model, const FormProvenance& form, const PatchLayout& layout,
+                        const ExportOptions& options)
+{
+    std::ostringstream out;
+    exportChart(model, form, layout, options, out);
+    return out.str();
 }
 
 } // namespace veltmarquist::exporting

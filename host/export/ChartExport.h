@@ -18,6 +18,7 @@
 #include "ChartLayouts.h"
 
 #include <optional>
+#include <ostream>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -78,6 +79,12 @@ void checkOptions(const ExportOptions& options);
 // Throws HostError: Usage for spectra or an ink limit with the library
 // format or an ink limit out of range; for a coverage the model does not
 // predict, as checkPredictable; Calculation for a value that is not finite.
+// The chart is predicted, checked and written in batches of patches, so that
+// memory stays constant apart from the layout itself whatever the chart's
+// size; every value is checked finite before it is formatted. On a throw,
+// `out` holds a part of the chart: write it where a failure discards it.
+void exportChart(const PrintModel& model, const FormProvenance& form, const PatchLayout& layout,
+                 const ExportOptions& options, std::ostream& out);
 std::string exportChart(const PrintModel& model, const FormProvenance& form, const PatchLayout& layout,
                         const ExportOptions& options);
 

@@ -429,30 +429,43 @@ std::pair<Table, std::optional<Error>> readTable(std::string_view text)
     return {std::move(table), std::move(error)};
 }
 
-std::string write(const Document& document)
+std::string headerText(const std::string& sheetType, const std::vector<std::pair<std::string, std::string>>& keywords,
+                       const std::vector<std::string>& fields, size_t sets)
 {
-    std::string text = writtenValue(document.sheetType, false) + "\n";
-    for (const auto& [name, value] : document.keywords) {
+    std::string text = writtenValue(sheetType, false) + "\n";
+    for (const auto& [name, value] : keywords) {
         if (!isKeyword(name))
             throw std::invalid_argument("not a CGATS keyword: " + excerpt(name));
         text += name + "\t" + writtenValue(value, true) + "\n";
     }
-    text += "NUMBER_OF_FIELDS\t" + std::to_string(document.fields.size()) + "\nBEGIN_DATA_FORMAT\n";
-    for (size_t i = 0; i < document.fields.size(); ++i) {
-        if (writtenValue(document.fields[i], false) != document.fields[i])
-            throw std::invalid_argument("a field name is one plain word: " + excerpt(document.fields[i]));
-        text += (i == 0 ? "" : "\t") + document.fields[i];
+    text += "NUMBER_OF_FIELDS\t" + std::to_string(fields.size()) + "\nBEGIN_DATA_FORMAT\n";
+    for (size_t i = 0; i < fields.size(); ++i) {
+        if (writtenValue(fields[i], false) != fields[i])
+            throw std::invalid_argument("a field name is one plain word: " + excerpt(fields[i]));
+        text += (i == 0 ? "" : "\t") + fields[i];
     }
-    text += "\nEND_DATA_FORMAT\nNUMBER_OF_SETS\t" + std::to_string(document.rows.size()) + "\nBEGIN_DATA\n";
+    return text + "\nEND_DATA_FORMAT\nNUMBER_OF_SETS\t" + std::to_string(sets) + "\nBEGIN_DATA\n";
+}
+
+void appendCell(std::string& line, const std::string& value, bool first)
+{
+    if (!first)
+        line += '\t';
+    line += writtenValue(value, false);
+}
+
+std::string write(const Document& document)
+{
+    std::string text = headerText(document.sheetType, document.keywords, document.fields, document.rows.size());
     for (const std::vector<std::string>& row : document.rows) {
         if (row.size() != document.fields.size())
             throw std::invalid_argument("a row of " + std::to_string(row.size()) + " values for " +
                                         std::to_string(document.fields.size()) + " fields");
         for (size_t i = 0; i < row.size(); ++i)
-            text += (i == 0 ? "" : "\t") + writtenValue(row[i], false);
+            appendCell(text, row[i], i == 0);
         text += '\n';
     }
-    return text + "END_DATA\n";
+    return text + kEndText;
 }
 
 std::string excerpt(std::string_view text, size_t limit)

@@ -91,6 +91,14 @@ struct Document {
 };
 std::string write(const Document& document);
 
+// The same text in pieces, for a writer that streams its rows: everything
+// up to and including BEGIN_DATA, one cell of a row (TAB before all but the
+// first, quoted as write quotes it), and the text after the last row.
+std::string headerText(const std::string& sheetType, const std::vector<std::pair<std::string, std::string>>& keywords,
+                       const std::vector<std::string>& fields, size_t sets);
+void appendCell(std::string& line, const std::string& value, bool first);
+constexpr const char* kEndText = "END_DATA\n";
+
 // `text` cut to `limit` characters with "..." when longer: file content in
 // messages stays short whatever the file holds.
 std::string excerpt(std::string_view text, size_t limit = 40);

@@ -146,8 +146,10 @@ std::size_t writeChart(const Model& model, const py::object& pathGiven, const py
     refuseClashingOutputs({model.found->path, exporting::isGeneratedLayout(layoutName) ? "" : layoutName}, {path});
     const exporting::PatchLayout layout = exporting::readLayout(layoutName);
     PendingOutput output(path);
-    output.write(exporting::exportChart(*model.fit.model, exporting::provenanceOf(model.found->file, model.found->path),
-                                        layout, options));
+    output.writeStreamed([&](std::ostream& out) {
+        exporting::exportChart(*model.fit.model, exporting::provenanceOf(model.found->file, model.found->path), layout,
+                               options, out);
+    });
     output.commit();
     return layout.size();
 }

@@ -44,7 +44,9 @@ void runChart(const ChartJob& job, ChartResult& result)
         report.emplace(job.report);
     FittedModel fit = fitModel(form, job.model);
     if (output)
-        output->write(exporting::exportChart(*fit.model, exporting::provenanceOf(form.file, job.form), layout, options));
+        output->writeStreamed([&](std::ostream& out) {
+            exporting::exportChart(*fit.model, exporting::provenanceOf(form.file, job.form), layout, options, out);
+        });
     if (options.format != exporting::ChartFormat::library || job.layout != "chart") {
         result.layout = layout.description;
         if (options.format != exporting::ChartFormat::library)
