@@ -9,7 +9,9 @@
 # - read as XHTML (the same bytes as .xhtml): the browser's XML parser must
 #   take it and find every section;
 # - the press sheet's report printed to PDF: the sections start on their own
-#   A4 pages.
+#   A4 pages;
+# - a sheet of over 100,000 checked combinations: at most 3 MB of HTML, and
+#   the time chromium takes to render it.
 # The pages stay in $build/report-pages for a look.
 set -euo pipefail
 cd "$(dirname "$0")/../.."
@@ -61,6 +63,32 @@ four="summary form spectra tone-values"
 report offset-form "$four" samples/offset_form.txt
 report press-sheet "$four check" samples/offset_press_sheet.txt --model ynsn
 report seven-inks "summary solids chart ramps" samples/seven_ink_form.txt --inks 7
+
+# A sheet of the form and 104,976 further combinations (18 levels per ink) as
+# the Yule-Nielsen model of the bundled form predicts them: the report stays
+# small (the a*b* plane aggregates), and the time the browser takes is shown.
+/usr/bin/python3 - "$pages/large-layout.txt" <<'PY'
+import itertools, sys
+text = open("samples/offset_form.txt").read().split("\n")
+fields = text[text.index("BEGIN_DATA_FORMAT") + 1].split()
+data = text[text.index("BEGIN_DATA") + 1:text.index("END_DATA")]
+cmyk = [fields.index(f) for f in ("CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K")]
+rows = [tuple(line.split()[i] for i in cmyk) for line in data]
+rows += [tuple(f"{100 * v / 17:.3f}" for v in levels) for levels in itertools.product(range(18), repeat=4)]
+with open(sys.argv[1], "w") as out:
+    out.write("CGATS.17\nBEGIN_DATA_FORMAT\nSAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K\nEND_DATA_FORMAT\nBEGIN_DATA\n")
+    out.writelines(f"{n} {' '.join(row)}\n" for n, row in enumerate(dict.fromkeys(rows), 1))
+    out.write("END_DATA\n")
+PY
+"$tool" chart samples/offset_form.txt --model ynsn --format cgats --spectral --layout "$pages/large-layout.txt" \
+  -o "$pages/large-sheet.txt" >/dev/null
+"$tool" report "$pages/large-sheet.txt" --model ynsn -o "$pages/large-sheet.html" >"$pages/large-sheet.txt.report"
+size=$(stat -c %s "$pages/large-sheet.html")
+[ "$size" -le 3145728 ] || { echo "large-sheet: the report has $size bytes, 3 MB at most"; exit 1; }
+started=$(date +%s.%N)
+browse "$pages/large-sheet.html" --screenshot="$pages/large-sheet.png" --window-size=1280,4000 >/dev/null 2>&1
+echo "large-sheet: $(grep -o 'check: [0-9]*' "$pages/large-sheet.txt.report" | cut -d' ' -f2) combinations checked, $size bytes," \
+  "rendered by chromium in $(echo "$(date +%s.%N) - $started" | bc) s (browser start included)"
 
 browse "$pages/press-sheet.html" --print-to-pdf="$pages/press-sheet.pdf" --no-pdf-header-footer >/dev/null 2>&1
 pdfPages=$(grep -ao '/Count [0-9]*' "$pages/press-sheet.pdf" | awk '$2 > n { n = $2 } END { print n + 0 }')

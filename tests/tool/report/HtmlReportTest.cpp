@@ -201,6 +201,47 @@ TEST(HtmlReport, ShowsWhatTheFileSaysEscaped)
         EXPECT_EQ(page.string(std::string("//h:table[@class='facts']/h:tr[h:td='") + keyword + "']/h:td[2]"), shown);
 }
 
+TEST(HtmlReport, StaysSmallWhenThousandsOfCombinationsAreChecked)
+{
+    // A sheet of the form and 4,096 further combinations, as the Yule-Nielsen
+    // model of the sample predicts their spectra.
+    ts::TempDir dir;
+    std::string layout = "CGATS.17\nBEGIN_DATA_FORMAT\nSAMPLE_ID\tCMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K\nEND_DATA_FORMAT\nBEGIN_DATA\n";
+    int id = 0;
+    const auto add = [&](const Cmyk& cmyk) {
+        layout += std::to_string(++id);
+        for (double value : cmyk)
+            layout += "\t" + std::to_string(value);
+        layout += "\n";
+    };
+    for (int patch = 0; patch < MeasuredForm::kPatches; ++patch)
+        add(MeasuredForm::coverageOf(patch));
+    for (int c = 0; c < 8; ++c)
+        for (int m = 0; m < 8; ++m)
+            for (int y = 0; y < 8; ++y)
+                for (int k = 0; k < 8; ++k)
+                    add({5.0 + 13.0 * c, 5.0 + 13.0 * m, 5.0 + 13.0 * y, 5.0 + 13.0 * k});
+    std::ofstream(dir.path("layout.txt")) << layout << "END_DATA\n";
+    ChartJob sheet;
+    sheet.form = kSamples + "/offset_form.txt";
+    sheet.model = ModelChoice::yuleNielsen;
+    sheet.layout = dir.path("layout.txt");
+    sheet.format = "cgats";
+    sheet.spectral = true;
+    sheet.output = dir.path("sheet.txt");
+    ChartResult made;
+    runChart(sheet, made);
+
+    const auto [html, text] = report({"", dir.path("sheet.txt"), 0, true, false, {}}, dir);
+    const Page page(html);
+    ASSERT_TRUE(page.wellFormed());
+    EXPECT_NE(text.find("check: 4096 "), std::string::npos) << text;
+    // Cells of the a*b* plane and the 200 worst drawn one by one, not a mark per combination.
+    EXPECT_EQ(page.count("//h:section[@id='check']//s:circle"), 200);
+    EXPECT_GT(page.count("//h:section[@id='check']//s:rect[@class='cell']"), 20);
+    EXPECT_LT(html.size(), 600u << 10);
+}
+
 // ---- The command line ---------------------------------------------------------------------------
 
 struct ToolRun {

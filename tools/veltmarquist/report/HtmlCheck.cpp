@@ -87,6 +87,12 @@ std::string histogram(const std::vector<CheckedPatch>& check, const Summary& sum
 
 // ---- a*b* plane ---------------------------------------------------------------------------------
 
+std::string heatColour(double value, bool& dark);
+
+// Combinations drawn one by one in the plane; beyond, cells of the plane
+// (kCells per axis) and the kWorstDrawn worst combinations.
+constexpr size_t kEveryMark = 2000, kCells = 60, kWorstDrawn = 200;
+
 // The convex hull (Andrew's monotone chain), counter-clockwise.
 svg::Points hull(svg::Points points)
 {
@@ -127,8 +133,48 @@ std::string abPlane(const std::vector<CheckedPatch>& check, const std::vector<si
     }
     const svg::Plot plot(600, 600, {-reach, reach}, {-reach, reach}, 52, 14, 10, 42);
     const double step = reach > 100 ? 40 : 20;
-    std::string lines, dots, ranks;
-    for (size_t i = 0; i < check.size(); ++i) {
+    // Up to kEveryMark combinations each get a dot and a line; beyond that
+    // one mark per combination could not be seen anyway and would make the
+    // page slow: the plane is split into cells coloured by the mean
+    // difference of the measured colours in them, and only the worst
+    // combinations are drawn one by one.
+    const bool aggregated = check.size() > kEveryMark;
+    std::vector<size_t> drawn;
+    if (aggregated) {
+        const std::vector<size_t> order = worstFirst(check);
+        drawn.assign(order.begin(), order.begin() + static_cast<std::ptrdiff_t>(kWorstDrawn));
+    } else {
+        drawn.resize(check.size());
+        std::iota(drawn.begin(), drawn.end(), 0);
+    }
+    std::string cells, lines, dots, ranks;
+    if (aggregated) {
+        std::vector<double> sum(kCells * kCells, 0.0);
+        std::vector<size_t> count(kCells * kCells, 0);
+        const double width = 2.0 * reach / kCells;
+        for (size_t i = 0; i < check.size(); ++i) {
+            const double a = measured[i].first, b = measured[i].second, d = check[i].deltaE2000;
+            if (!std::isfinite(a) || !std::isfinite(b) || !std::isfinite(d))
+                continue;
+            const auto cellOf = [&](double value) {
+                return std::min(kCells - 1, static_cast<size_t>(std::max(0.0, (value + reach) / width)));
+            };
+            const size_t cell = cellOf(b) * kCells + cellOf(a);
+            sum[cell] += d;
+            ++count[cell];
+        }
+        for (size_t row = 0; row < kCells; ++row)
+            for (size_t column = 0; column < kCells; ++column) {
+                const size_t cell = row * kCells + column;
+                if (count[cell] == 0)
+                    continue;
+                bool dark = false;
+                const double a = -reach + width * static_cast<double>(column), b = -reach + width * static_cast<double>(row);
+                cells += plot.box(a, b, a + width, b + width, "cell",
+                                  heatColour(sum[cell] / static_cast<double>(count[cell]), dark));
+            }
+    }
+    for (size_t i : drawn) {
         lines += plot.line(measured[i].first, measured[i].second, predicted[i].first, predicted[i].second, "error");
         dots += plot.marker(measured[i].first, measured[i].second, "circle", 2.4, "dot",
                             srgbOfXYZ(check[i].measuredXYZ).hex());
@@ -143,8 +189,11 @@ std::string abPlane(const std::vector<CheckedPatch>& check, const std::vector<si
     description += " predicted:";
     for (const auto& [a, b] : predictedHull)
         description += " " + fixed(a, 1) + " " + fixed(b, 1) + ";";
-    description += " Each combination, a* b* measured > predicted:";
-    for (size_t i = 0; i < check.size(); ++i)
+    description += aggregated ? " Cells of " + fixed(2.0 * reach / kCells, 1) +
+                                    " a*b* units coloured by the mean CIEDE2000 of the measured colours in them; the " +
+                                    std::to_string(kWorstDrawn) + " worst combinations, a* b* measured > predicted:"
+                              : std::string(" Each combination, a* b* measured > predicted:");
+    for (size_t i : drawn)
         description += " " + cmykText(check[i].device) + " " + fixed(measured[i].first, 1) + " " +
                        fixed(measured[i].second, 1) + " > " + fixed(predicted[i].first, 1) + " " +
                        fixed(predicted[i].second, 1) + ";";
@@ -152,9 +201,13 @@ std::string abPlane(const std::vector<CheckedPatch>& check, const std::vector<si
            plot.start("Measured and predicted colours in the a*b* plane", description) +
            plot.axes(svg::ticks({-reach, reach}, step), 0, "a*", svg::ticks({-reach, reach}, step), 0, "b*") +
            plot.line(-reach, 0, reach, 0, "unity") + plot.line(0, -reach, 0, reach, "unity") +
-           plot.polygon(measuredHull, "hull-measured") + plot.polygon(predictedHull, "hull-predicted") + lines + dots +
-           ranks + svg::Plot::end() +
-           "<p class=\"legend\">Dots: measured colours (in their own colour); <span class=\"key error\"></span>line "
+           cells + plot.polygon(measuredHull, "hull-measured") + plot.polygon(predictedHull, "hull-predicted") + lines +
+           dots + ranks + svg::Plot::end() + "<p class=\"legend\">" +
+           (aggregated ? "Squares: the mean " + std::string(kDeltaE00) + " of the " + std::to_string(check.size()) +
+                             " measured colours in each, on the scale of the map below. Dots: the " +
+                             std::to_string(kWorstDrawn) + " worst combinations (in their own colour); "
+                       : std::string("Dots: measured colours (in their own colour); ")) +
+           "<span class=\"key error\"></span>line "
            "to the predicted colour; <span class=\"key measured\"></span>outline of the measured colours; "
            "<span class=\"key hull-predicted\"></span>outline of the predicted ones. Numbers: the worst "
            "combinations as ranked in the table below.</p></figure>\n";

@@ -109,12 +109,14 @@ std::string Plot::line(double x1, double y1, double x2, double y2, const std::st
            attribute("x2", coordinate(px(x2))) + attribute("y2", coordinate(py(y2))) + classOf(cssClass) + "/>";
 }
 
-std::string Plot::box(double x1, double y1, double x2, double y2, const std::string& cssClass) const
+std::string Plot::box(double x1, double y1, double x2, double y2, const std::string& cssClass,
+                      const std::string& fill) const
 {
     const double left = std::fmin(px(x1), px(x2)), top = std::fmin(py(y1), py(y2));
     return "<rect" + attribute("x", coordinate(left)) + attribute("y", coordinate(top)) +
            attribute("width", coordinate(std::fabs(px(x2) - px(x1)))) +
-           attribute("height", coordinate(std::fabs(py(y2) - py(y1)))) + classOf(cssClass) + "/>";
+           attribute("height", coordinate(std::fabs(py(y2) - py(y1)))) + classOf(cssClass) +
+           (fill.empty() ? "" : attribute("fill", fill)) + "/>";
 }
 
 std::string Plot::marker(double x, double y, const std::string& shape, double radius, const std::string& cssClass,

@@ -43,7 +43,8 @@ public:
     std::string polygon(const Points& points, const std::string& cssClass) const;
     std::string line(double x1, double y1, double x2, double y2, const std::string& cssClass) const;
     // A rectangle between two data corners.
-    std::string box(double x1, double y1, double x2, double y2, const std::string& cssClass) const;
+    std::string box(double x1, double y1, double x2, double y2, const std::string& cssClass,
+                    const std::string& fill = "") const;
     // A marker: "circle", "square", "diamond" or "triangle", radius in pixels.
     std::string marker(double x, double y, const std::string& shape, double radius, const std::string& cssClass,
                        const std::string& fill = "") const;
