@@ -27,9 +27,9 @@ Failure failureOf(ReadFailure kind)
     return Failure::InputSyntax;
 }
 
-double paperY(const MeasurementFile& file, const std::vector<size_t>& sets)
+double paperY(const MeasurementFile& file, const SetList& sets)
 {
-    const std::vector<int> thousandths = averageThousandths(file, sets);
+    const std::vector<int> thousandths = averageThousandths(file, sets.begin(), sets.size());
     return XYZOfBands(libraryBands({&file.layout, &thousandths}))[1];
 }
 
@@ -39,7 +39,7 @@ void warnAboutPaper(MeasurementFile& file)
     const std::vector<size_t> paper = file.paperSets();
     if (paper.empty() || !file.layout.present())
         return;
-    const double Y = paperY(file, paper);
+    const double Y = paperY(file, SetList(paper.data(), paper.size()));
     if (Y < 20.0)
         file.warnings.push_back("the paper (" + file.sets[paper[0]].where() + ") has Y " + fixedText(Y, 1) +
                                 ": a paper is far brighter; is it measured on black, or is it not the paper?");
@@ -47,7 +47,7 @@ void warnAboutPaper(MeasurementFile& file)
     for (size_t channel = 0; channel < file.deviceFields.size() && channel < 4; ++channel) {
         std::vector<double> solid(file.deviceFields.size(), 0.0);
         solid[channel] = 100.0;
-        const std::vector<size_t>& sets = index.find(solid);
+        const SetList sets = index.find(solid);
         if (sets.empty() || paperY(file, sets) <= Y)
             continue;
         file.warnings.push_back("the paper (Y " + fixedText(Y, 1) + ") is darker than the solid " +

@@ -14,10 +14,6 @@ namespace veltmarquist {
 
 namespace {
 
-// Device vectors of different lengths compare as if padded with zeros, so a
-// C, M, Y, K request finds a seven-channel set whose further inks are 0.
-const size_t kMaxChannels = 16;
-
 std::string plural(const std::string& noun)
 {
     return noun + (noun.size() > 2 && noun.compare(noun.size() - 2, 2, "ch") == 0 ? "es" : "s");
@@ -90,33 +86,61 @@ std::string describeDevice(const std::vector<double>& device)
 
 // ---- Matching ------------------------------------------------------------------------------------
 
+std::size_t CombinationIndex::KeyHash::operator()(const Key& key) const
+{
+    std::uint64_t hash = 0;
+    for (std::int32_t value : key)
+        hash = (hash ^ static_cast<std::uint32_t>(value)) * 0x9E3779B97F4A7C15ull;
+    return static_cast<std::size_t>(hash ^ (hash >> 32));
+}
+
 CombinationIndex::CombinationIndex(const MeasurementFile& file)
 {
+    // Each set's group, then the groups laid out one after the other.
+    std::vector<std::uint32_t> groupOf(file.sets.size());
+    std::vector<std::size_t> counts;
+    groups_.reserve(file.sets.size() / 2 + 16);
+    for (size_t i = 0; i < file.sets.size(); ++i) {
+        const auto [at, added] = groups_.try_emplace(keyOf(file.sets[i]), static_cast<std::uint32_t>(counts.size()));
+        if (added)
+            counts.push_back(0);
+        groupOf[i] = at->second;
+        ++counts[at->second];
+    }
+    first_.assign(counts.size() + 1, 0);
+    for (size_t g = 0; g < counts.size(); ++g)
+        first_[g + 1] = first_[g] + counts[g];
+    std::vector<std::size_t> next(first_.begin(), first_.end() - 1);
+    members_.resize(file.sets.size());
     for (size_t i = 0; i < file.sets.size(); ++i)
-        sets_[keyOf(file.sets[i])].push_back(i);
+        members_[next[groupOf[i]]++] = i;
 }
 
 CombinationIndex::Key CombinationIndex::keyOf(const std::vector<double>& device)
 {
-    Key key(kMaxChannels, 0);
+    Key key{};
     for (size_t channel = 0; channel < device.size() && channel < kMaxChannels; ++channel)
-        key[channel] = std::lround(device[channel] * 10.0);
+    {
+        const double tenths = std::round(device[channel] * 10.0);
+        key[channel] = std::isfinite(tenths) ? static_cast<std::int32_t>(std::clamp(tenths, -2e9, 2e9)) : INT32_MIN;
+    }
     return key;
 }
 
 CombinationIndex::Key CombinationIndex::keyOf(const MeasurementSet& set)
 {
-    Key key(kMaxChannels, 0);
+    Key key{};
     for (size_t channel = 0; channel < set.device.size() && channel < kMaxChannels; ++channel)
-        key[channel] = static_cast<long>(divideRounded(set.device[channel], kDeviceUnits / 10));
+        key[channel] = static_cast<std::int32_t>(divideRounded(set.device[channel], kDeviceUnits / 10));
     return key;
 }
 
-const std::vector<size_t>& CombinationIndex::find(const std::vector<double>& device) const
+SetList CombinationIndex::find(const std::vector<double>& device) const
 {
-    static const std::vector<size_t> none;
-    const auto found = sets_.find(keyOf(device));
-    return found == sets_.end() ? none : found->second;
+    const auto found = groups_.find(keyOf(device));
+    if (found == groups_.end())
+        return {};
+    return {members_.data() + first_[found->second], first_[found->second + 1] - first_[found->second]};
 }
 
 PickedPatches pickPatches(const MeasurementFile& file, const std::vector<PatchRequest>& requests,
@@ -133,7 +157,7 @@ PickedPatches pickPatches(const MeasurementFile& file, const std::vector<PatchRe
     std::vector<bool> used(file.sets.size(), false);
     std::vector<const PatchRequest*> missing;
     for (const PatchRequest& request : requests) {
-        const std::vector<size_t>& sets = index.find(request.device);
+        const SetList sets = index.find(request.device);
         if (sets.empty()) {
             const bool listed = std::any_of(missing.begin(), missing.end(), [&](const PatchRequest* other) {
                 return other->kind == request.kind && other->label == request.label;
@@ -142,7 +166,7 @@ PickedPatches pickPatches(const MeasurementFile& file, const std::vector<PatchRe
                 missing.push_back(&request);
             continue;
         }
-        picked.thousandths.push_back(averageThousandths(file, sets));
+        picked.thousandths.push_back(averageThousandths(file, sets.begin(), sets.size()));
         picked.averaged += sets.size() > 1 ? 1 : 0;
         for (size_t set : sets)
             used[set] = true;

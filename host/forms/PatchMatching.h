@@ -10,7 +10,9 @@
 
 #include "MeasurementFile.h"
 
-#include <map>
+#include <array>
+#include <cstdint>
+#include <unordered_map>
 #include <string>
 #include <vector>
 
@@ -33,20 +35,49 @@ std::vector<PatchRequest> multiChannelRequests(int inks);
 // "C 0 M 90 Y 0 K 0" or, beyond four channels, "ink5 100".
 std::string describeDevice(const std::vector<double>& device);
 
-// The sets of a file grouped by device values (to 0.1 %).
+// Indices of the sets measured with one combination, in file order: a view
+// into the index that made it.
+class SetList {
+public:
+    SetList() = default;
+    SetList(const std::size_t* first, std::size_t count) : first_(first), count_(count) {}
+    bool empty() const { return count_ == 0; }
+    std::size_t size() const { return count_; }
+    std::size_t operator[](std::size_t i) const { return first_[i]; }
+    const std::size_t* begin() const { return first_; }
+    const std::size_t* end() const { return first_ + count_; }
+
+private:
+    const std::size_t* first_ = nullptr;
+    std::size_t count_ = 0;
+};
+
+// The sets of a file grouped by device values (to 0.1 %). A combination is a
+// flat key of whole tenths of a percent, one per channel, so building the
+// index allocates nothing per set: one hash entry per combination and one
+// array of set indices grouped by combination.
 class CombinationIndex {
 public:
-    explicit CombinationIndex(const MeasurementFile& file);
-    // Indices of the sets measured with these device values (percent); empty if none.
-    const std::vector<size_t>& find(const std::vector<double>& device) const;
-    size_t combinations() const { return sets_.size(); }
+    static constexpr std::size_t kMaxChannels = 16;
+    using Key = std::array<std::int32_t, kMaxChannels>;
 
-    using Key = std::vector<long>;
+    explicit CombinationIndex(const MeasurementFile& file);
+    // The sets measured with these device values (percent); empty if none.
+    SetList find(const std::vector<double>& device) const;
+    size_t combinations() const { return first_.size() - 1; }
+
+    // Device vectors of different lengths compare as if padded with zeros, so
+    // a C, M, Y, K request finds a seven-channel set whose further inks are 0.
     static Key keyOf(const std::vector<double>& device);
     static Key keyOf(const MeasurementSet& set);
 
 private:
-    std::map<Key, std::vector<size_t>> sets_;
+    struct KeyHash {
+        std::size_t operator()(const Key& key) const;
+    };
+    std::unordered_map<Key, std::uint32_t, KeyHash> groups_; // combination -> group number
+    std::vector<std::size_t> members_;                       // set indices, group by group, in file order
+    std::vector<std::size_t> first_;                         // group g: members_[first_[g] .. first_[g + 1])
 };
 
 struct PickedPatches {

@@ -71,10 +71,10 @@ std::vector<CheckedPatch> checkPredictions(const MeasurementFile& file, const st
     std::vector<Cmyk> found;
     std::vector<Triple> measuredXYZ;
     for (const Cmyk& coverage : coverages) {
-        const std::vector<size_t>& sets = measured.find(std::vector<double>(coverage.begin(), coverage.end()));
+        const SetList sets = measured.find(std::vector<double>(coverage.begin(), coverage.end()));
         if (sets.empty() || !skip.insert(keyOf(coverage)).second)
             continue;
-        const std::vector<int> thousandths = averageThousandths(file, sets);
+        const std::vector<int> thousandths = averageThousandths(file, sets.begin(), sets.size());
         found.push_back(coverage);
         measuredXYZ.push_back(XYZOfBands(libraryBands({&file.layout, &thousandths})));
     }

@@ -447,14 +447,14 @@ std::vector<size_t> MeasurementFile::paperSets() const
     return paper;
 }
 
-std::vector<int> averageThousandths(const MeasurementFile& file, const std::vector<size_t>& sets)
+std::vector<int> averageThousandths(const MeasurementFile& file, const size_t* sets, size_t count)
 {
     std::vector<int> mean(static_cast<size_t>(file.layout.bands));
     for (size_t band = 0; band < mean.size(); ++band) {
         std::int64_t sum = 0;
-        for (size_t set : sets)
-            sum += file.sets[set].reflectance[band];
-        const std::int64_t divisor = static_cast<std::int64_t>(sets.size()) * (kReflectanceUnits / 1000);
+        for (size_t i = 0; i < count; ++i)
+            sum += file.sets[sets[i]].reflectance[band];
+        const std::int64_t divisor = static_cast<std::int64_t>(count) * (kReflectanceUnits / 1000);
         mean[band] = static_cast<int>(divideRounded(sum, divisor));
     }
     return mean;

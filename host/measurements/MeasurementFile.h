@@ -77,7 +77,11 @@ struct MeasurementFile {
 // Mean reflectance of `sets` in the library's thousandths, per band: the sum
 // of the exact readings divided once, half away from zero, so identical
 // readings give exactly that reading.
-std::vector<int> averageThousandths(const MeasurementFile& file, const std::vector<size_t>& sets);
+std::vector<int> averageThousandths(const MeasurementFile& file, const size_t* sets, size_t count);
+inline std::vector<int> averageThousandths(const MeasurementFile& file, const std::vector<size_t>& sets)
+{
+    return averageThousandths(file, sets.data(), sets.size());
+}
 
 struct ReadOptions {
     // Reflectance scale: 0 decides it from the paper and the bulk of the
