@@ -31,6 +31,7 @@
 // contraction into fused multiply-add. Candidates are compared in the order of
 // the straightforward loop, so ties resolve the same way.
 #include "GrayFitFastPath.h"
+#include "LaneLoops.h"
 #include "ProfileSteps.h"
 #include "models/FourColourKernels.h"
 
@@ -38,26 +39,6 @@
 #include <cstring>
 #include <limits>
 
-// The lane loops are built for the baseline instruction set and, on x86-64,
-// also for AVX2 and AVX-512, chosen at load time. All give the same bits:
-// only the vector width differs, and contraction into fused multiply-add is
-// off for every target. Sanitized builds keep the baseline version alone:
-// load-time selection runs before the sanitizer runtime is set up.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-#define GRAYFIT_SANITIZED
-#elif defined(__has_feature)
-#if __has_feature(address_sanitizer) || __has_feature(thread_sanitizer)
-#define GRAYFIT_SANITIZED
-#endif
-#endif
-#if defined(__x86_64__) && defined(__has_attribute) && !defined(GRAYFIT_SANITIZED)
-#if __has_attribute(target_clones)
-#define GRAYFIT_LANE_LOOP __attribute__((target_clones("avx512f", "avx2", "default")))
-#endif
-#endif
-#ifndef GRAYFIT_LANE_LOOP
-#define GRAYFIT_LANE_LOOP
-#endif
 
 namespace grayfit {
 
@@ -149,7 +130,7 @@ inline void yellowLanesAtBand(const Primaries& primaries, const InkRow& cyan, co
 }
 
 // Three-colour grey, one yellow factor per lane.
-GRAYFIT_LANE_LOOP
+VELTMARQUIST_LANE_LOOP
 void yellowLaneSums(const Primaries& primaries, const InkRow& cyan, const InkRow& magenta, const InkRow& black,
                     const InkLanes<kYellowLanes>& yellow, LaneSums<kYellowLanes>& out)
 {
@@ -173,7 +154,7 @@ void yellowLaneSum(const Primaries& primaries, const InkRow& cyan, const InkRow&
 // term adds nothing to R (x + 0 = x, and the sum starts at +0), and each with
 // nK is x * 1 = x, so the eight primaries without black give the same R bit
 // for bit with half the work.
-GRAYFIT_LANE_LOOP
+VELTMARQUIST_LANE_LOOP
 void yellowLaneSumsWithoutBlack(const Primaries& primaries, const InkRow& cyan, const InkRow& magenta,
                                 const InkLanes<kYellowLanes>& yellow, LaneSums<kYellowLanes>& out)
 {
@@ -205,7 +186,7 @@ void yellowLaneSumsWithoutBlack(const Primaries& primaries, const InkRow& cyan, 
 // Four-colour grey, one black factor per lane. The straightforward form of
 // each weight stands on the right; the products left of black's term come
 // from `terms`, formed in the same order.
-GRAYFIT_LANE_LOOP
+VELTMARQUIST_LANE_LOOP
 void blackLaneSums(const Primaries& primaries, const BandTerms* terms, const InkLanes<kBlackLanes>& black,
                    LaneSums<kBlackLanes>& out)
 {

@@ -162,17 +162,18 @@ std::string PrintModel::refusal(const double* cmyk) const
 {
     for (int ink = 0; ink < 4; ++ink) {
         const double c = cmyk[ink];
+        // The negated test also refuses NaN. The text is made only for a refusal.
+        const bool coverage = c >= 0.0 && c <= 100.0;
+        const bool level = levels_.empty() || std::find(levels_.begin(), levels_.end(), c) != levels_.end();
+        if (coverage && level)
+            continue;
         const std::string named = std::string(1, kInkLetters[ink]) + " " + number(c);
-        // The negated test also refuses NaN.
-        if (!(c >= 0.0 && c <= 100.0))
+        if (!coverage)
             return named + " is not a coverage from 0 to 100 %";
-        if (!levels_.empty() && std::find(levels_.begin(), levels_.end(), c) == levels_.end()) {
-            std::string listed;
-            for (double level : levels_)
-                listed += (listed.empty() ? "" : ", ") + number(level);
-            return "the " + name_ + " model predicts only the form's levels " + listed + " %; " + named +
-                   " is not one";
-        }
+        std::string listed;
+        for (double value : levels_)
+            listed += (listed.empty() ? "" : ", ") + number(value);
+        return "the " + name_ + " model predicts only the form's levels " + listed + " %; " + named + " is not one";
     }
     return std::string();
 }
@@ -190,13 +191,18 @@ Spectrum PrintModel::predict(const Cmyk& cmyk) const
     return spectrum;
 }
 
-void PrintModel::predict(std::size_t count, const double* cmyk, double* spectra, double* XYZ, double* Lab) const
+void PrintModel::checkCoverages(std::size_t count, const double* cmyk) const
 {
     for (std::size_t i = 0; i < count; ++i) {
         const std::string refused = refusal(cmyk + 4 * i);
         if (!refused.empty())
             throw std::invalid_argument("patch " + std::to_string(i) + ": " + refused);
     }
+}
+
+void PrintModel::predict(std::size_t count, const double* cmyk, double* spectra, double* XYZ, double* Lab) const
+{
+    checkCoverages(count, cmyk);
     for (std::size_t i = 0; i < count; ++i) {
         Spectrum spectrum;
         predictAccepted(cmyk + 4 * i, spectrum.data());

@@ -112,6 +112,10 @@ public:
     // std::domain_error naming the patch; the arrays then hold the patches
     // before it. The arrays must not overlap `cmyk`.
     void predict(std::size_t count, const double* cmyk, double* spectra, double* XYZ, double* Lab) const;
+    // Checks `count` coverages as the batch predict checks them, without
+    // predicting: std::invalid_argument naming the first refused patch
+    // (counted from 0). For hosts that split a batch over threads.
+    void checkCoverages(std::size_t count, const double* cmyk) const;
 
 protected:
     PrintModel(std::string name, std::vector<FittedValue> values, std::vector<double> levels);

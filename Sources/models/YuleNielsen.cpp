@@ -29,6 +29,7 @@
 #include "YuleNielsen.h"
 
 #include "Colorimetry.h"
+#include "LaneLoops.h"
 #include "LeastSquares.h"
 #include "MonotoneCurve.h"
 
@@ -314,6 +315,25 @@ YuleNielsenFit fitYuleNielsen(const FormPatches& measured)
     return fit;
 }
 
+namespace {
+
+// sum[band] = the weights times the primaries' roots, added primary by
+// primary from 0; bands are lanes.
+VELTMARQUIST_LANE_LOOP
+void neugebauerSum(const double (&weight)[kPrimaries], const std::array<Bands, kPrimaries>& root, double (&sum)[kBands])
+{
+    for (int band = 0; band < kBands; ++band)
+        sum[band] = 0.0;
+    for (int b = 0; b < kPrimaries; ++b) {
+        const double w = weight[b];
+        const double* r = root[static_cast<size_t>(b)].data();
+        for (int band = 0; band < kBands; ++band)
+            sum[band] += w * r[band];
+    }
+}
+
+} // namespace
+
 void predictYuleNielsen(const YuleNielsenFit& fit, const double cmyk[kInks], double* spectrum)
 {
     const std::array<double, kNodes>& nodes = curveNodes();
@@ -338,14 +358,15 @@ void predictYuleNielsen(const YuleNielsenFit& fit, const double cmyk[kInks], dou
         std::copy(fit.primary[b].begin(), fit.primary[b].end(), spectrum);
         return;
     }
-    Bands sum{};
+    double weight[kPrimaries];
     for (int b = 0; b < kPrimaries; ++b) {
         double w = 1.0;
         for (int ink = 0; ink < kInks; ++ink)
             w *= (b >> ink & 1) ? spread[ink] : 1.0 - spread[ink];
-        for (int band = 0; band < kBands; ++band)
-            sum[band] += w * fit.primaryRoot[b][band];
+        weight[b] = w;
     }
+    double sum[kBands];
+    neugebauerSum(weight, fit.primaryRoot, sum);
     for (int band = 0; band < kBands; ++band)
         spectrum[band] = std::pow(sum[band], fit.n[band]);
 }

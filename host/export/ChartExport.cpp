@@ -5,6 +5,7 @@
 #include "ColourDifference.h"
 #include "Failure.h"
 #include "Numbers.h"
+#include "ParallelPrediction.h"
 
 #include "models/PrintModels.h"
 
@@ -180,9 +181,9 @@ void appendNumbers(std::string& line, const double* values, int count, const Pat
     }
 }
 
-// Patches predicted and written per step: memory stays that of one batch
-// whatever the layout's size.
-constexpr std::size_t kBatch = 2048;
+// Patches predicted (on every core) and written per step: memory stays that
+// of one batch whatever the layout's size.
+constexpr std::size_t kBatch = 4 * kParallelBatch;
 
 // The library's own XYZ chart of the layout's patches, numbered from 1 (a
 // file layout's SAMPLE_IDs do not survive: the format has no place for them),
@@ -268,8 +269,8 @@ void exportChart(const PrintModel& model, const FormProvenance& form, const Patc
     std::string text;
     for (std::size_t first = 0; first < count; first += kBatch) {
         const std::size_t size = std::min(kBatch, count - first);
-        model.predict(size, &layout.cmyk[4 * first], options.spectral ? spectra.data() : nullptr, XYZ.data(),
-                      nullptr);
+        predictInParallel(model, size, &layout.cmyk[4 * first], options.spectral ? spectra.data() : nullptr,
+                          XYZ.data(), nullptr);
         text.clear();
         for (std::size_t i = 0; i < size; ++i) {
             const std::size_t patch = first + i;

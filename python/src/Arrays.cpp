@@ -48,6 +48,13 @@ py::array_t<double> Rows::shaped(std::vector<double> values, std::size_t columns
     return py::array_t<double>(shape, owned->data(), owner);
 }
 
+py::array_t<double> Rows::allocate(std::size_t columns) const
+{
+    std::vector<py::ssize_t> shape = leading_;
+    shape.push_back(static_cast<py::ssize_t>(columns));
+    return py::array_t<double>(shape);
+}
+
 std::string pathOf(const py::handle& given, const char* what)
 {
     const py::module_ os = py::module_::import("os");

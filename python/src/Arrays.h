@@ -36,6 +36,8 @@ public:
     const double* row(std::size_t index) const { return values_.data() + index * columns_; }
     // An array of `columns` doubles per row in the shape of these rows.
     py::array_t<double> shaped(std::vector<double> values, std::size_t columns) const;
+    // A new, unfilled array of `columns` doubles per row in the shape of these rows.
+    py::array_t<double> allocate(std::size_t columns) const;
 
 private:
     std::vector<double> values_;

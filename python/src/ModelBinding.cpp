@@ -7,6 +7,7 @@
 #include "Failure.h"
 #include "FourColourForm.h"
 #include "OutputFile.h"
+#include "ParallelPrediction.h"
 #include "PrintProfile.h"
 
 #include <pybind11/stl.h>
@@ -114,10 +115,12 @@ py::tuple predict(const Model& model, const py::object& cmyk)
     const py::object prediction = py::module_::import("veltmarquist._results").attr("Prediction");
     const Rows rows(cmyk, 4, "cmyk");
     warnAboutFractions(rows);
-    std::vector<double> spectra(rows.count() * kSpectrumBands), XYZ(rows.count() * 3), Lab(rows.count() * 3);
+    // Predicted straight into the arrays handed back, without the GIL, on every core.
+    py::array_t<double> spectra = rows.allocate(kSpectrumBands), XYZ = rows.allocate(3), Lab = rows.allocate(3);
+    double *spectraData = spectra.mutable_data(), *XYZData = XYZ.mutable_data(), *LabData = Lab.mutable_data();
     try {
         py::gil_scoped_release released;
-        model.fit.model->predict(rows.count(), rows.data(), spectra.data(), XYZ.data(), Lab.data());
+        predictInParallel(*model.fit.model, rows.count(), rows.data(), spectraData, XYZData, LabData);
     } catch (const std::invalid_argument& refusal) {
         // One coverage was given: its refusal needs no patch number.
         const std::string message = refusal.what(), patch = "patch 0: ";
@@ -125,8 +128,7 @@ py::tuple predict(const Model& model, const py::object& cmyk)
                                   ? message.substr(patch.size())
                                   : message);
     }
-    return prediction(rows.shaped(std::move(spectra), kSpectrumBands), rows.shaped(std::move(XYZ), 3),
-                      rows.shaped(std::move(Lab), 3));
+    return prediction(spectra, XYZ, Lab);
 }
 
 std::size_t writeChart(const Model& model, const py::object& pathGiven, const py::object& layoutGiven,
