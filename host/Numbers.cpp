@@ -42,6 +42,12 @@ std::string fixedText(double value, int decimals)
     return written(text, result.ptr);
 }
 
+std::string signedFixedText(double value, int decimals)
+{
+    const std::string out = fixedText(value, decimals);
+    return out[0] == '-' || out.find_first_not_of("0.") == std::string::npos ? out : "+" + out;
+}
+
 std::string shortText(double value)
 {
     if (!std::isfinite(value))

@@ -14,6 +14,8 @@ namespace veltmarquist {
 std::string roundTripText(double value);
 // `decimals` digits after the point ("12.30"): for people.
 std::string fixedText(double value, int decimals);
+// The same with a sign: "+1.5", "-0.3", and "0.0" for a value that rounds to zero.
+std::string signedFixedText(double value, int decimals);
 // Six significant digits without trailing zeros, as printf's %g ("0.95", "272", "1e+06").
 std::string shortText(double value);
 

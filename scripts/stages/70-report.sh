@@ -95,9 +95,22 @@ pdfPages=$(grep -ao '/Count [0-9]*' "$pages/press-sheet.pdf" | awk '$2 > n { n =
 [ "$pdfPages" -ge 5 ] || { echo "press-sheet: printed on $pdfPages pages; each of its 5 sections starts a page"; exit 1; }
 echo "press-sheet: printed on $pdfPages A4 pages"
 
+# Conformance of the bundled press sheet against itself (PASS, exit 0) and,
+# when Debian's reference data sets are installed, against FOGRA39L.
+"$tool" conformance samples/offset_press_sheet.txt --reference samples/offset_press_sheet.txt \
+  --report "$pages/conformance-self.html" >"$pages/conformance-self.txt"
+grep -q 'verdict: PASS' "$pages/conformance-self.txt" || { cat "$pages/conformance-self.txt"; exit 1; }
+echo "conformance: the press sheet against itself passes"
+
 data=../shared/data/APTEC_PC10_CardBoard_2023_v1_Spectral.txt
 if [ ! -f "$data" ]; then
   echo "skipped: the report of a real measurement: no evaluation data set at $data (the real press data set is not beside the project)"
   exit 0
 fi
 report real-data "$four check" "$data" --model ynsn
+status=0
+"$tool" conformance "$data" --reference FOGRA39L --report "$pages/conformance-real.html" \
+  >"$pages/conformance-real.txt" || status=$?
+[ "$status" -eq 0 ] || [ "$status" -eq 10 ] || { cat "$pages/conformance-real.txt"; exit 1; }
+echo "conformance of the real data set against FOGRA39L (exit $status):"
+sed -n '/^reference:/,$p' "$pages/conformance-real.txt"

@@ -184,7 +184,7 @@ TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
         // The chart's temporary file exists when the second output fails.
         {{"multichannel", "form7.txt", "--inks", "7", "-o", "keep.txt", "--combinations", "no-folder/c.txt"}, 8,
          "no-folder/c.txt: cannot create a file in no-folder/"},
-        {{"chrat", "form7.txt"}, 2, "unknown command 'chrat'; commands: profile, chart, report, compare, multichannel, convert"},
+        {{"chrat", "form7.txt"}, 2, "unknown command 'chrat'; commands: profile, chart, report, conformance, compare, multichannel, convert"},
         {{"--frob", "chart"}, 2, "'--frob' is not a command or --help or --version; give the command first"},
         // An empty or unusable output, or an option value no press has, is refused before anything is read.
         {{"chart", "twice.txt", "-o", ""}, 2, "--output: an empty path names no file"},

@@ -41,7 +41,8 @@ const char* const kExitCodes =
     "  6  a patch the calculation needs is missing\n"
     "  7  duplicate patch: one sample identifier names two different patches\n"
     "  8  an output cannot be written (including standard output)\n"
-    "  9  the library rejected or failed the calculation, or its result is not finite\n";
+    "  9  the library rejected or failed the calculation, or its result is not finite\n"
+    " 10  conformance: the press is out of tolerance (the verdict FAIL)\n";
 
 std::string versionText()
 {
@@ -93,8 +94,9 @@ int main(int argc, char** argv)
     app.set_version_flag("--version", versionText());
     app.require_subcommand(1);
     app.footer(kExitCodes);
-    const Command commands[] = {setupProfileCommand(app),      setupChartCommand(app),   setupReportCommand(app),
-                                setupCompareCommand(app),      setupMultiChannelCommand(app), setupConvertCommand(app)};
+    const Command commands[] = {setupProfileCommand(app),     setupChartCommand(app),        setupReportCommand(app),
+                                setupConformanceCommand(app), setupCompareCommand(app),      setupMultiChannelCommand(app),
+                                setupConvertCommand(app)};
 
     // A closed pipe shows as EPIPE where the tool writes: the report stops
     // quietly, a chart on standard output ends the run quietly.
@@ -145,5 +147,5 @@ int main(int argc, char** argv)
                               std::string("standard output: cannot write the report: ") +
                                   std::strerror(reportBuffer.error())),
                     report);
-    return 0;
+    return chosen->status ? chosen->status() : 0;
 }

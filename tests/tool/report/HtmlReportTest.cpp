@@ -287,4 +287,36 @@ TEST(ReportCommand, WritesWhereItIsToldAndRefusesWhatCannotGoTogether)
     EXPECT_TRUE(Page(ts::readFile(dir.path("report.html"))).wellFormed());
 }
 
+TEST(ConformanceCommand, VerdictAsExitCodeAndPageConditionsRefused)
+{
+    const std::string sheet = "'" + kSamples + "/offset_press_sheet.txt' ";
+    ts::TempDir dir;
+    // Against itself: PASS, exit 0, and the page says so.
+    ToolRun run = tool("conformance " + sheet + "--reference " + sheet + "--report page.html", dir);
+    EXPECT_EQ(run.exitCode, 0) << run.err;
+    EXPECT_NE(run.out.find("verdict: PASS (40 of 40 checks within tolerance)"), std::string::npos) << run.out;
+    const Page page(ts::readFile(dir.path("page.html")));
+    ASSERT_TRUE(page.wellFormed());
+    EXPECT_EQ(page.string("//*[@id='verdict']"), "PASS");
+    EXPECT_EQ(page.count("//h:table[@id='controls']/h:tr"), 13);
+    EXPECT_EQ(page.count("//h:section[@id='gamut']"), 1);
+    // Tolerances no press meets: FAIL, its own exit code.
+    std::ofstream(dir.path("tight.txt")) << "paper 0.001\n";
+    std::string other = ts::readFile(kSamples + "/offset_form.txt");
+    std::ofstream(dir.path("form.txt")) << other;
+    run = tool("conformance form.txt --reference " + sheet + "--tolerances tight.txt --no-gamut", dir);
+    EXPECT_EQ(run.exitCode, 10) << run.err;
+    EXPECT_NE(run.out.find("verdict: FAIL"), std::string::npos);
+    // Another measurement condition: refused unless asked for.
+    other.insert(other.find('\n') + 1, "FILTER\t\"M2\"\n");
+    std::ofstream(dir.path("m2.txt")) << other;
+    std::ofstream(dir.path("m1.txt")) << "CTI3\nFILTER \"M1\"\n" << ts::readFile(kSamples + "/offset_press_sheet.txt").substr(9);
+    run = tool("conformance m2.txt --reference m1.txt --no-gamut", dir);
+    EXPECT_EQ(run.exitCode, 2);
+    EXPECT_NE(run.err.find("measurement condition M2 against the reference's M1"), std::string::npos) << run.err;
+    run = tool("conformance m2.txt --reference m1.txt --no-gamut --any-condition", dir);
+    EXPECT_NE(run.exitCode, 2) << run.err;
+    EXPECT_NE(run.out.find("compared although they differ"), std::string::npos);
+}
+
 } // namespace

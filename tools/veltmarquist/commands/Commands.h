@@ -32,7 +32,13 @@ struct Command {
     // Runs the command and renders its result on `report`, also the part a
     // failure left.
     std::function<void(std::ostream& report)> run;
+    // The exit code of a run that ended without a failure (empty: 0).
+    std::function<int()> status;
 };
+
+// The exit code of a conformance check whose verdict is FAIL: distinct from
+// every failure's code (Failure.h).
+constexpr int kExitOutOfTolerance = 10;
 
 Command setupChartCommand(CLI::App& app);
 Command setupReportCommand(CLI::App& app);
@@ -40,6 +46,7 @@ Command setupCompareCommand(CLI::App& app);
 Command setupMultiChannelCommand(CLI::App& app);
 Command setupConvertCommand(CLI::App& app);
 Command setupProfileCommand(CLI::App& app);
+Command setupConformanceCommand(CLI::App& app);
 
 // ---- What chart and report run, and multichannel and report --inks -----------------------
 

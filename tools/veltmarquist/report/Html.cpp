@@ -153,8 +153,7 @@ std::string text(const std::string& raw)
 
 std::string signedFixed(double value, int decimals)
 {
-    const std::string out = fixed(value, decimals);
-    return out[0] == '-' || out.find_first_not_of("0.") == std::string::npos ? out : "+" + out;
+    return signedFixedText(value, decimals);
 }
 
 std::string pageStart(const std::string& title)

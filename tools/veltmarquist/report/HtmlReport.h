@@ -21,6 +21,10 @@ std::string htmlReport(const ChartResult& result);
 // Needs the form and the chart.
 std::string htmlReport(const MultiChannelResult& result);
 
+// The conformance check: verdict, control patches, tone value increase and
+// the whole gamut. Needs the form, the reference and the comparison.
+std::string conformanceReport(const ConformanceRun& run);
+
 } // namespace veltmarquist
 
 #endif // VELTMARQUIST_TOOL_HTMLREPORT_H

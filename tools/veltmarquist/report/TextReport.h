@@ -16,6 +16,7 @@ void renderCompare(const CompareResult& result, std::ostream& out);
 void renderMultiChannel(const MultiChannelResult& result, std::ostream& out);
 void renderConvert(const ConvertResult& result, std::ostream& out);
 void renderProfile(const ProfileResult& result, std::ostream& out);
+void renderConformance(const ConformanceRun& run, std::ostream& out);
 
 } // namespace veltmarquist
 

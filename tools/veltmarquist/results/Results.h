@@ -9,6 +9,7 @@
 #define VELTMARQUIST_TOOL_RESULTS_H
 
 #include "ColourDifference.h"
+#include "Conformance.h"
 #include "FourColourForm.h"
 #include "MeasurementFile.h"
 #include "PatchMatching.h"
@@ -56,6 +57,14 @@ struct ProfileResult : FormAndModel {
     std::string version;   // "2.4" or "4.3"
     std::string written;   // empty until delivered
     ModelCheck check;
+};
+
+// conformance FORM --reference REF
+struct ConformanceRun : FormAndModel {
+    std::optional<conformance::Reference> reference;
+    std::vector<std::string> conditions;  // the measurement conditions compared, as the report says them
+    std::optional<conformance::ConformanceResult> result;
+    std::string report; // the HTML page's name once delivered
 };
 
 // compare FORM
