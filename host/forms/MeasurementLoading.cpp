@@ -2,11 +2,16 @@
 #include "MeasurementLoading.h"
 
 #include "ColourDifference.h"
+#include "Cxf3.h"
 #include "LibraryBlock.h"
 #include "PatchMatching.h"
 #include "Failure.h"
 #include "Numbers.h"
 
+#include <filesystem>
+#include <fstream>
+#include <optional>
+#include <sstream>
 
 namespace veltmarquist {
 
@@ -58,9 +63,36 @@ void warnAboutPaper(MeasurementFile& file)
 
 } // namespace
 
+namespace {
+
+// A CxF3 file as the CGATS text of its data; nullopt for any other file
+// (the reader then reads or refuses it as it is).
+std::optional<std::string> cxf3Text(const std::string& path)
+{
+    std::ifstream in(path, std::ios::binary);
+    char start[256] = {};
+    in.read(start, sizeof start);
+    if (!in.gcount() || !cxf::looksLikeXml(std::string_view(start, static_cast<size_t>(in.gcount()))))
+        return std::nullopt;
+    std::error_code error;
+    const auto bytes = std::filesystem::file_size(path, error);
+    if (error || bytes > static_cast<std::uintmax_t>(kMaxFileBytes))
+        return std::nullopt; // the reader names what is wrong with it
+    in.clear();
+    in.seekg(0);
+    std::ostringstream text;
+    text << in.rdbuf();
+    return cxf::cgatsOfCxf3(text.str(), path);
+}
+
+} // namespace
+
 MeasurementFile loadMeasurementFile(const std::string& path, const ReadOptions& options)
 {
-    ReadResult result = readMeasurementFile(path, options);
+    const std::optional<std::string> cxf = cxf3Text(path);
+    ReadResult result = cxf ? readMeasurementText(*cxf, options) : readMeasurementFile(path, options);
+    if (cxf && !result.ok())
+        result.error.line = 0; // a line of the CGATS form, which the user never sees
     if (!result.ok()) {
         const ReadError& error = result.error;
         const std::string where = error.line > 0 ? path + ":" + std::to_string(error.line) : path;
