@@ -9,6 +9,8 @@ namespace veltmarquist {
 
 std::string fileStem(const std::string& path)
 {
+    if (path == "-")
+        return "stdin";
     const size_t slash = path.rfind('/');
     std::string base = slash == std::string::npos ? path : path.substr(slash + 1);
     const size_t dot = base.rfind('.');

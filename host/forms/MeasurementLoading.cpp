@@ -10,6 +10,7 @@
 
 #include <filesystem>
 #include <fstream>
+#include <iostream>
 #include <optional>
 #include <sstream>
 
@@ -87,15 +88,33 @@ std::optional<std::string> cxf3Text(const std::string& path)
 
 } // namespace
 
+// Standard input ("-") read whole, CGATS or CxF3.
+ReadResult readStandardInput(const ReadOptions& options, bool& fromCxf)
+{
+    std::ostringstream text;
+    text << std::cin.rdbuf();
+    const std::string input = text.str();
+    fromCxf = cxf::looksLikeXml(std::string_view(input).substr(0, 256));
+    return readMeasurementText(fromCxf ? cxf::cgatsOfCxf3(input, "standard input") : input, options);
+}
+
 MeasurementFile loadMeasurementFile(const std::string& path, const ReadOptions& options)
 {
-    const std::optional<std::string> cxf = cxf3Text(path);
-    ReadResult result = cxf ? readMeasurementText(*cxf, options) : readMeasurementFile(path, options);
-    if (cxf && !result.ok())
+    bool fromCxf = false;
+    ReadResult result;
+    if (path == kStandardInput) {
+        result = readStandardInput(options, fromCxf);
+    } else {
+        const std::optional<std::string> cxf = cxf3Text(path);
+        fromCxf = cxf.has_value();
+        result = cxf ? readMeasurementText(*cxf, options) : readMeasurementFile(path, options);
+    }
+    if (fromCxf && !result.ok())
         result.error.line = 0; // a line of the CGATS form, which the user never sees
     if (!result.ok()) {
         const ReadError& error = result.error;
-        const std::string where = error.line > 0 ? path + ":" + std::to_string(error.line) : path;
+        const std::string name = path == kStandardInput ? "standard input" : path;
+        const std::string where = error.line > 0 ? name + ":" + std::to_string(error.line) : name;
         throw HostError(failureOf(error.kind), where + ": " + error.message);
     }
     warnAboutPaper(*result.file);

@@ -13,6 +13,9 @@ namespace veltmarquist {
 // Reads and parses a measurement file; errors become HostErrors that name
 // the file and line. Adds to the file's warnings: a paper with Y below 20, a
 // paper darker than one of its solids.
+// `path` "-" reads standard input; a CxF3 file (Cxf3.h) is read as the CGATS
+// text of its data.
+constexpr const char* kStandardInput = "-";
 MeasurementFile loadMeasurementFile(const std::string& path, const ReadOptions& options);
 
 } // namespace veltmarquist

@@ -197,7 +197,7 @@ TEST(CommandLine, EachKindOfFailureHasItsExitCodeAndLeavesNoOutput)
         {{"chart", "twice.txt", "-o", "x.ti3", "--format", "cti3", "--ink-limit", "0x12C"}, 2, "'0x12C' is not a"},
         {{"chart", "twice.txt", "-o", "keep.txt", "--model", "ynsn", "--process", "gravure"}, 2,
          "--process gravure contradicts --model ynsn"},
-        {{"compare", "twice.txt", "-o", "-"}, 2, "standard output (-) cannot hold two files"},
+        {{"compare", "twice.txt", "-o", "-", "--json", "-q"}, 2, "--json excludes --quiet"},
         {{"profile", "twice.txt", "-o", "x.icc", "--b2a-grid", "32"}, 2, "B2A grid 32: a B2A table has an odd number"},
         {{"profile", "short.txt", "-o", "x.icc", "--black", "ripe"}, 2, "--black: ripe not in"},
         {{"profile", "dark.txt", "-o", "x.icc", "--ink-limit", "450"}, 2, "'450' is not a total ink limit"},
@@ -246,4 +246,56 @@ TEST(Outputs, ToolWritesStandardOutputAndRemovesItsTemporaryFileWhenStopped)
         EXPECT_EQ(WIFSIGNALED(status) ? WTERMSIG(status) : -1, signal) << "status " << status;
         EXPECT_EQ(entries(dir.path("tmp")), 0) << "a temporary file was left";
     }
+}
+
+TEST(Scripts, JsonOnEveryCommandQuietVerboseAndStandardStreams)
+{
+    ts::TempDir dir;
+    const std::string samples = VELTMARQUIST_SAMPLES_DIR;
+    const std::vector<std::vector<std::string>> commands = {
+        {"chart", samples + "/offset_press_sheet.txt", "-o", "c.txt"},
+        {"report", samples + "/offset_form.txt", "-o", "r.html"},
+        {"compare", samples + "/offset_form.txt"},
+        {"multichannel", samples + "/seven_ink_form.txt", "--inks", "7", "-o", "m.txt"},
+        {"convert", samples + "/chart_two_whites.txt", "--from", "PAPER_PRINTED", "--to", samples + "/target_paper.txt",
+         "-o", "v.txt"},
+        {"profile", samples + "/offset_form.txt", "-o", "p.icc", "--grid", "5", "--b2a-grid", "9"},
+        {"conformance", samples + "/offset_press_sheet.txt", "--reference", samples + "/offset_press_sheet.txt"}};
+    for (std::vector<std::string> arguments : commands) {
+        SCOPED_TRACE(arguments[0]);
+        arguments.push_back("--json");
+        const ToolRun run = runTool(arguments, dir.dir());
+        EXPECT_EQ(run.exitCode, 0) << run.err;
+        // One JSON object on one line, parsed by Python's own reader.
+        EXPECT_EQ(std::count(run.out.begin(), run.out.end(), '\n'), 1);
+        std::ofstream(dir.path("out.json")) << run.out;
+        EXPECT_EQ(std::system(("python3 -c 'import json, sys; d = json.load(open(sys.argv[1])); "
+                               "sys.exit(0 if d[\"schema_version\"] == 1 and d[\"command\"] == sys.argv[2] and d[\"ok\"] "
+                               "and d[\"written\"] is not None else 1)' '" +
+                               dir.path("out.json") + "' " + arguments[0])
+                                  .c_str()),
+                  0)
+            << run.out;
+        arguments.back() = "-q";
+        const ToolRun quiet = runTool(arguments, dir.dir());
+        EXPECT_EQ(quiet.exitCode, 0);
+        EXPECT_EQ(quiet.out + quiet.err, "");
+    }
+    // -v adds the fitted values; a failure under --json: ok false, the error on stderr.
+    const ToolRun verbose = runTool({"chart", samples + "/offset_form.txt", "-o", "c.txt", "-v"}, dir.dir());
+    EXPECT_NE(verbose.out.find("fitted values:\n  gray difference factor (C, M, Y, K): "), std::string::npos);
+    const ToolRun failed = runTool({"chart", "missing.txt", "-o", "c.txt", "--json"}, dir.dir());
+    EXPECT_EQ(failed.exitCode, 3);
+    EXPECT_THAT(failed.out, StartsWith("{\"schema_version\":1,\"command\":\"chart\",\"ok\":false"));
+    EXPECT_NE(failed.err.find("missing.txt"), std::string::npos);
+    // - reads the form from standard input; compare -o - writes both charts to standard output.
+    const int piped = std::system(("cd '" + dir.dir() + "' && '" VELTMARQUIST_TOOL "' chart - -o - -q <'" + samples +
+                                   "/offset_form.txt' >piped.txt")
+                                      .c_str());
+    EXPECT_EQ(piped, 0);
+    EXPECT_EQ(runTool({"chart", samples + "/offset_form.txt", "-o", "direct.txt", "-q"}, dir.dir()).exitCode, 0);
+    EXPECT_TRUE(ts::readFile(dir.path("piped.txt")) == ts::readFile(dir.path("direct.txt")));
+    const ToolRun both = runTool({"compare", samples + "/offset_form.txt", "-o", "-", "-q"}, dir.dir());
+    EXPECT_EQ(both.exitCode, 0) << both.err;
+    EXPECT_EQ(both.out.substr(both.out.find("END_DATA\n") + 9).substr(0, 5), "IT8\r\n") << "the modelled chart follows";
 }

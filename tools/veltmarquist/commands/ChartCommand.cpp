@@ -10,6 +10,7 @@
 #include "CommandOptions.h"
 #include "OutputFile.h"
 #include "report/HtmlReport.h"
+#include "report/JsonReport.h"
 #include "report/TextReport.h"
 
 #include "ChartExport.h"
@@ -69,6 +70,7 @@ Command setupChartCommand(CLI::App& app)
         ChartJob job;
         ScaleOption scale;
         ModelOption model;
+        ReportStyle style;
     };
     const auto options = std::make_shared<Options>();
     ChartJob& job = options->job;
@@ -105,11 +107,13 @@ Command setupChartCommand(CLI::App& app)
         ->check(kPath);
     options->model.add(*command);
     options->scale.add(*command);
+    options->style.add(*command);
     return {command, [options] { return std::vector<std::string>{options->job.output, options->job.report}; },
             [options](std::ostream& report) {
                 options->job.model = options->model.choice();
                 options->job.read = options->scale.readOptions();
-                runAndRender<ChartResult>([&](ChartResult& result) { runChart(options->job, result); }, renderChart,
+                runAndRender<ChartResult>([&](ChartResult& result) { runChart(options->job, result); },
+                                          options->style.pick<ChartResult>(renderChart, jsonChart),
                                           report);
             }};
 }

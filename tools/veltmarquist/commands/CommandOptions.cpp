@@ -3,6 +3,7 @@
 
 #include "ChartExport.h"
 #include "Failure.h"
+#include "Numbers.h"
 
 #include <charconv>
 
@@ -96,6 +97,27 @@ void addInkLimit(CLI::App& command, std::optional<double>& inkLimit, const std::
         .add_option_function<std::string>(
             "--ink-limit", [&inkLimit](const std::string& text) { inkLimit = decimalPercentage(text); }, help)
         ->check(percentage);
+}
+
+void ReportStyle::add(CLI::App& command)
+{
+    CLI::Option* asJson = command.add_flag("--json", json, "print one JSON object for scripts instead of the report");
+    CLI::Option* silent = command.add_flag("-q,--quiet", quiet, "no report, only errors");
+    command.add_flag("-v,--verbose", verbose, "also every fitted value of the model")->excludes(asJson)->excludes(silent);
+    silent->excludes(asJson);
+}
+
+void printFittedValues(const FormAndModel& result, std::ostream& out)
+{
+    if (!result.fit)
+        return;
+    out << "fitted values:\n";
+    for (const FittedValue& value : result.fit->model->fittedValues()) {
+        out << "  " << value.name << ":";
+        for (double number : value.numbers)
+            out << " " << roundTripText(number);
+        out << (value.text.empty() ? "" : " " + value.text) << "\n";
+    }
 }
 
 } // namespace veltmarquist

@@ -5,11 +5,15 @@
 
 #include "MeasurementFile.h"
 #include "ModelChoice.h"
+#include "results/Results.h"
 
 #include <CLI/CLI.hpp>
 
+#include <functional>
 #include <optional>
+#include <ostream>
 #include <string>
+#include <type_traits>
 
 namespace veltmarquist {
 
@@ -19,6 +23,35 @@ struct ScaleOption {
     void add(CLI::App& command);
     ReadOptions readOptions() const;
 };
+
+// How a command reports: the text report (default), --json one JSON object
+// for scripts (JsonReport.h), -q nothing but errors, -v the text report and
+// every fitted value of the model in full.
+struct ReportStyle {
+    bool json = false, quiet = false, verbose = false;
+    void add(CLI::App& command);
+
+    template <typename Result>
+    using Render = void (*)(const Result&, std::ostream&);
+    // The renderer the options choose among a command's text and JSON ones.
+    template <typename Result>
+    std::function<void(const Result&, std::ostream&)> pick(Render<Result> text, Render<Result> asJson) const
+    {
+        if (json)
+            return asJson;
+        if (quiet)
+            return [](const Result&, std::ostream&) {};
+        if constexpr (std::is_base_of_v<FormAndModel, Result>)
+            if (verbose)
+                return [text](const Result& result, std::ostream& out) {
+                    text(result, out);
+                    printFittedValues(result, out);
+                };
+        return text;
+    }
+};
+// Every fitted value of the model, one per line (for -v).
+void printFittedValues(const FormAndModel& result, std::ostream& out);
 
 // --model offset|gravure|gravure-fitted|ynsn, with the older spellings kept:
 // --model library (the library's model that --process names), --process

@@ -8,9 +8,11 @@
 #include "Failure.h"
 #include "Files.h"
 #include "OutputFile.h"
+#include "report/JsonReport.h"
 #include "report/TextReport.h"
 
 #include <memory>
+#include <optional>
 
 namespace veltmarquist {
 
@@ -25,16 +27,18 @@ struct CompareJob {
 
 void runCompare(const CompareJob& job, CompareResult& result)
 {
-    if (isStandardOutput(job.folder))
-        throw HostError(Failure::Usage, "compare writes two charts into a folder: -o names that folder, and "
-                                        "standard output (-) cannot hold two files");
+    // Into a folder as two files, or both charts one after the other on standard output.
+    const bool standardOutput = isStandardOutput(job.folder);
     const std::string folder = job.folder.back() == '/' ? job.folder : job.folder + "/";
     const std::string stem = folder + fileStem(job.form);
-    const std::string measuredPath = stem + ".measured46.txt", modelPath = stem + "." + kindOf(job.model) + "46.txt";
+    const std::string measuredPath = standardOutput ? job.folder : stem + ".measured46.txt";
+    const std::string modelPath = standardOutput ? "" : stem + "." + kindOf(job.model) + "46.txt";
     refuseClashingOutputs({job.form}, {measuredPath, modelPath});
     result.form = readTestForm(job.form, job.read, result.formWarnings);
     PendingOutput measuredChart(measuredPath);
-    PendingOutput modelChart(modelPath);
+    std::optional<PendingOutput> modelChart;
+    if (!standardOutput)
+        modelChart.emplace(modelPath);
 
     FittedModel fit = fitModel(*result.form, job.model);
     ModelledForm modelled = modelForm(*result.form, *fit.model);
@@ -48,15 +52,23 @@ void runCompare(const CompareJob& job, CompareResult& result)
         ab.push_back(patch.check.deltaEab);
     }
     // Both charts are checked before either is delivered: both or neither.
-    measuredChart.write(xyzChartText(coverages, measured));
-    modelChart.write(xyzChartText(coverages, modelledXYZ));
+    if (standardOutput) {
+        measuredChart.write(xyzChartText(coverages, measured) + xyzChartText(coverages, modelledXYZ));
+    } else {
+        measuredChart.write(xyzChartText(coverages, measured));
+        modelChart->write(xyzChartText(coverages, modelledXYZ));
+    }
     result.fit = std::move(fit);
     result.modelled = std::move(modelled);
     result.deltaEab = summarise(ab);
     measuredChart.commit();
-    modelChart.commit();
     result.measuredWritten = measuredChart.name();
-    result.modelWritten = modelChart.name();
+    if (modelChart) {
+        modelChart->commit();
+        result.modelWritten = modelChart->name();
+    } else {
+        result.modelWritten = result.measuredWritten + ", after the measured chart";
+    }
 }
 
 } // namespace
@@ -67,6 +79,7 @@ Command setupCompareCommand(CLI::App& app)
         CompareJob job;
         ScaleOption scale;
         ModelOption model;
+        ReportStyle style;
     };
     const auto options = std::make_shared<Options>();
     CLI::App* command = app.add_subcommand(
@@ -76,17 +89,19 @@ Command setupCompareCommand(CLI::App& app)
         ->check(kPath);
     command
         ->add_option("-o,--output-folder", options->job.folder,
-                     "folder for FORM.measured46.txt and FORM.offset46.txt / .gravure46.txt / .ynsn46.txt")
+                     "folder for FORM.measured46.txt and FORM.offset46.txt / .gravure46.txt / .ynsn46.txt; - writes "
+                     "both charts to standard output, the measured one first")
         ->capture_default_str()
         ->check(kPath);
     options->model.add(*command);
     options->scale.add(*command);
-    return {command, [] { return std::vector<std::string>{}; },
+    options->style.add(*command);
+    return {command, [options] { return std::vector<std::string>{options->job.folder}; },
             [options](std::ostream& report) {
                 options->job.model = options->model.choice();
                 options->job.read = options->scale.readOptions();
                 runAndRender<CompareResult>([&](CompareResult& result) { runCompare(options->job, result); },
-                                            renderCompare, report);
+                                            options->style.pick<CompareResult>(renderCompare, jsonCompare), report);
             }};
 }
 

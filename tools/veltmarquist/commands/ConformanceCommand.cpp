@@ -10,6 +10,7 @@
 #include "OutputFile.h"
 #include "Text.h"
 #include "report/HtmlReport.h"
+#include "report/JsonReport.h"
 #include "report/TextReport.h"
 
 #include <memory>
@@ -62,6 +63,7 @@ Command setupConformanceCommand(CLI::App& app)
     struct Options {
         ConformanceJob job;
         ScaleOption scale;
+        ReportStyle style;
         ConformanceRun run;
     };
     const auto options = std::make_shared<Options>();
@@ -86,16 +88,18 @@ Command setupConformanceCommand(CLI::App& app)
     command->add_flag("!--no-gamut", options->job.gamut, "leave out the whole-gamut prediction");
     command->add_option("--report", options->job.report, "also write an HTML page of the comparison")->check(kPath);
     options->scale.add(*command);
+    options->style.add(*command);
     return {command, [options] { return std::vector<std::string>{options->job.report}; },
             [options](std::ostream& report) {
                 options->job.read = options->scale.readOptions();
+                const auto render = options->style.pick<ConformanceRun>(renderConformance, jsonConformance);
                 try {
                     runConformance(options->job, options->run);
                 } catch (...) {
-                    renderConformance(options->run, report);
+                    render(options->run, report);
                     throw;
                 }
-                renderConformance(options->run, report);
+                render(options->run, report);
             },
             [options] { return options->run.result && !options->run.result->pass() ? kExitOutOfTolerance : 0; }};
 }

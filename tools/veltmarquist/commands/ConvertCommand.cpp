@@ -11,6 +11,7 @@
 #include "LibraryBlock.h"
 #include "MeasurementLoading.h"
 #include "OutputFile.h"
+#include "report/JsonReport.h"
 #include "report/TextReport.h"
 
 #include <sys/stat.h>
@@ -142,6 +143,7 @@ Command setupConvertCommand(CLI::App& app)
         ConvertJob job;
         std::string mode = "convert";
         ScaleOption scale;
+        ReportStyle style;
     };
     const auto options = std::make_shared<Options>();
     ConvertJob& job = options->job;
@@ -161,6 +163,7 @@ Command setupConvertCommand(CLI::App& app)
     command->add_flag("--cmyk-only", job.cmykOnly,
                       "drop channels 5-7 (the converted chart holds C, M, Y, K only) instead of refusing");
     options->scale.add(*command);
+    options->style.add(*command);
     return {command, [options] { return std::vector<std::string>{options->job.output}; },
             [options](std::ostream& report) {
                 ConvertJob& job = options->job;
@@ -170,7 +173,8 @@ Command setupConvertCommand(CLI::App& app)
                 if (job.mode != VM_PROCESS_CHART_COPY && (job.from.empty() || job.to.empty()))
                     throw HostError(Failure::Usage, "--mode " + mode + " needs --from and --to");
                 job.read = options->scale.readOptions();
-                runAndRender<ConvertResult>([&](ConvertResult& result) { runConvert(job, result); }, renderConvert,
+                runAndRender<ConvertResult>([&](ConvertResult& result) { runConvert(job, result); },
+                                            options->style.pick<ConvertResult>(renderConvert, jsonConvert),
                                             report);
             }};
 }

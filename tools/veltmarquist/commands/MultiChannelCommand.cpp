@@ -10,6 +10,7 @@
 #include "MultiChannelRun.h"
 #include "OutputFile.h"
 #include "report/HtmlReport.h"
+#include "report/JsonReport.h"
 #include "report/TextReport.h"
 
 #include "Cgats.h"
@@ -141,6 +142,7 @@ Command setupMultiChannelCommand(CLI::App& app)
     struct Options {
         MultiChannelJob job;
         ScaleOption scale;
+        ReportStyle style;
     };
     const auto options = std::make_shared<Options>();
     MultiChannelJob& job = options->job;
@@ -168,6 +170,7 @@ Command setupMultiChannelCommand(CLI::App& app)
     command->add_option("--report", job.report, "also write the HTML report of paper, solids, chart and ramps")
         ->check(kPath);
     options->scale.add(*command);
+    options->style.add(*command);
     return {command,
             [options] {
                 const MultiChannelJob& job = options->job;
@@ -176,7 +179,8 @@ Command setupMultiChannelCommand(CLI::App& app)
             [options](std::ostream& report) {
                 options->job.read = options->scale.readOptions();
                 runAndRender<MultiChannelResult>(
-                    [&](MultiChannelResult& result) { runMultiChannel(options->job, result); }, renderMultiChannel,
+                    [&](MultiChannelResult& result) { runMultiChannel(options->job, result); },
+                    options->style.pick<MultiChannelResult>(renderMultiChannel, jsonMultiChannel),
                     report);
             }};
 }

@@ -7,6 +7,7 @@
 #include "Failure.h"
 #include "Numbers.h"
 #include "OutputFile.h"
+#include "report/JsonReport.h"
 #include "report/TextReport.h"
 
 #include <unistd.h>
@@ -87,6 +88,7 @@ Command setupProfileCommand(CLI::App& app)
         ProfileJob job;
         ScaleOption scale;
         ModelOption model{ModelChoice::yuleNielsen};
+        ReportStyle style;
         std::string black = "heavy", version = "2";
         std::optional<double> start, amount, shape;
         bool fixed = false;
@@ -136,8 +138,8 @@ Command setupProfileCommand(CLI::App& app)
     command->add_option("--description", job.options.description,
                         "the profile's description (default: the form's DESCRIPTOR and the model)");
     command->add_option("--copyright", job.options.copyright, "the profile's copyright text");
-    command->add_flag("-q,--quiet", job.quiet, "no progress and no report, only errors");
     options->scale.add(*command);
+    options->style.add(*command);
     return {command, [options] { return std::vector<std::string>{options->job.output}; },
             [options](std::ostream& report) {
                 ProfileJob& job = options->job;
@@ -152,9 +154,9 @@ Command setupProfileCommand(CLI::App& app)
                 job.options.black.shape = options->shape.value_or(job.options.black.shape);
                 job.options.black.fixed = job.options.black.fixed || options->fixed;
                 job.options.version = options->version == "4" ? profile::IccVersion::v4 : profile::IccVersion::v2;
-                std::ostringstream silent;
-                runAndRender<ProfileResult>([&](ProfileResult& result) { runProfile(job, result); }, renderProfile,
-                                            job.quiet ? silent : report);
+                job.quiet = options->style.quiet || options->style.json;
+                runAndRender<ProfileResult>([&](ProfileResult& result) { runProfile(job, result); },
+                                            options->style.pick<ProfileResult>(renderProfile, jsonProfile), report);
             }};
 }
 

@@ -5,6 +5,7 @@
 
 #include "CommandOptions.h"
 #include "Failure.h"
+#include "report/JsonReport.h"
 #include "report/TextReport.h"
 
 #include <memory>
@@ -18,6 +19,7 @@ Command setupReportCommand(CLI::App& app)
         int inks = 0;
         ScaleOption scale;
         ModelOption model;
+        ReportStyle style;
         CLI::App* command = nullptr;
         CLI::Option* inksOption = nullptr;
     };
@@ -37,6 +39,7 @@ Command setupReportCommand(CLI::App& app)
                                               "a six- or seven-colour form (nCLR_1 ... nCLR_n fields)")
                               ->check(CLI::IsMember({6, 7}));
     options->scale.add(*command);
+    options->style.add(*command);
     return {command, [options] { return std::vector<std::string>{options->output}; },
             [options](std::ostream& report) {
                 if (options->inksOption->count() > 0) {
@@ -50,7 +53,8 @@ Command setupReportCommand(CLI::App& app)
                     job.report = options->output;
                     job.read = options->scale.readOptions();
                     runAndRender<MultiChannelResult>([&](MultiChannelResult& result) { runMultiChannel(job, result); },
-                                                     renderMultiChannel, report);
+                                                     options->style.pick<MultiChannelResult>(renderMultiChannel, jsonMultiChannel),
+                                                     report);
                     return;
                 }
                 ChartJob job;
@@ -58,7 +62,8 @@ Command setupReportCommand(CLI::App& app)
                 job.report = options->output;
                 job.model = options->model.choice();
                 job.read = options->scale.readOptions();
-                runAndRender<ChartResult>([&](ChartResult& result) { runChart(job, result); }, renderChart, report);
+                runAndRender<ChartResult>([&](ChartResult& result) { runChart(job, result); },
+                                          options->style.pick<ChartResult>(renderChart, jsonReport), report);
             }};
 }
 
