@@ -135,16 +135,19 @@ constexpr ExtendedKeys extendedKeys()
     for (const auto& run : blackRuns) // black, steps first..last (indices into greySteps)
         for (int s = run[1]; s <= run[2]; ++s)
             set.add(greySteps[s][0], greySteps[s][1], greySteps[s][2], run[0]);
-    // Shell sort (Ciura's gaps), then each key once.
-    const size_t gaps[] = {701, 301, 132, 57, 23, 10, 4, 1};
-    for (size_t gap : gaps)
-        for (size_t i = gap; i < set.size; ++i) {
-            const std::uint32_t key = set.keys[i];
-            size_t j = i;
-            for (; j >= gap && set.keys[j - gap] > key; j -= gap)
-                set.keys[j] = set.keys[j - gap];
-            set.keys[j] = key;
-        }
+    // Sorted byte by byte from the lowest (a radix sort: few enough steps
+    // for every compiler's constant evaluation), then each key once.
+    std::array<std::uint32_t, kExtendedAdds> sorted{};
+    for (int shift = 0; shift < 32; shift += 8) {
+        size_t start[257] = {};
+        for (size_t i = 0; i < set.size; ++i)
+            ++start[(set.keys[i] >> shift & 0xFF) + 1];
+        for (size_t digit = 0; digit < 256; ++digit)
+            start[digit + 1] += start[digit];
+        for (size_t i = 0; i < set.size; ++i)
+            sorted[start[set.keys[i] >> shift & 0xFF]++] = set.keys[i];
+        set.keys = sorted;
+    }
     size_t unique = 0;
     for (size_t i = 0; i < set.size; ++i)
         if (unique == 0 || set.keys[unique - 1] != set.keys[i])
