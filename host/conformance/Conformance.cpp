@@ -432,6 +432,7 @@ ConformanceResult compare(const FoundForm& form, const Reference& reference, con
                          {"skin tones (L* 50-85, C*ab 10-40, hue 30-75 degrees)", summarise(skin)},
                          {"dark colours (L* below 30)", summarise(dark)},
                          {"saturated colours (C*ab above 60)", summarise(saturated)}};
+        gamut.all = patches;
         std::stable_sort(patches.begin(), patches.end(),
                          [](const GamutPatch& a, const GamutPatch& b) { return a.deltaE00 > b.deltaE00; });
         patches.resize(std::min<size_t>(10, patches.size()));

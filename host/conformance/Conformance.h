@@ -100,6 +100,7 @@ struct GamutComparison {
     std::string model;
     std::vector<GamutRegion> regions;
     std::vector<GamutPatch> worst; // up to ten, worst first
+    std::vector<GamutPatch> all;   // every patch, in the reference's order
 };
 
 // Why two files' measurement conditions differ ("measurement condition M1

@@ -70,6 +70,9 @@ svg .error { stroke: #D55E00; stroke-width: 0.9; fill: none; }
 svg .dot { stroke: #6b6b70; stroke-width: 0.5; }
 svg .hull-measured { stroke: #000000; stroke-width: 1.4; fill: none; }
 svg .hull-predicted { stroke: #0072B2; stroke-width: 1.4; stroke-dasharray: 6 3; fill: none; }
+svg .tolerance { fill: #e4ecf5; stroke: none; }
+svg .point.fail { fill: #D55E00; stroke: #D55E00; }
+svg .cell { stroke: none; }
 svg .rank { font-size: 10px; font-weight: 700; }
 svg text.small { font-size: 10px; fill: var(--muted); }
 .key { display: inline-block; width: 26px; height: 0; vertical-align: middle; margin: 0 4px 0 12px; }

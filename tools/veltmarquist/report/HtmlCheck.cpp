@@ -87,8 +87,6 @@ std::string histogram(const std::vector<CheckedPatch>& check, const Summary& sum
 
 // ---- a*b* plane ---------------------------------------------------------------------------------
 
-std::string heatColour(double value, bool& dark);
-
 // Combinations drawn one by one in the plane; beyond, cells of the plane
 // (kCells per axis) and the kWorstDrawn worst combinations.
 constexpr size_t kEveryMark = 2000, kCells = 60, kWorstDrawn = 200;
@@ -223,23 +221,6 @@ size_t binOf(double coverage)
     return coverage <= 20.0 ? 0 : coverage <= 70.0 ? 1 : 2;
 }
 
-// Viridis, light (small differences) to dark (4 and above): safe for
-// colour-blind readers and still ordered in grey.
-std::string heatColour(double value, bool& dark)
-{
-    static const int stops[5][3] = {{253, 231, 37}, {94, 201, 98}, {33, 145, 140}, {59, 82, 139}, {68, 1, 84}};
-    const double at = std::min(std::max(value, 0.0), 4.0);
-    const size_t low = std::min<size_t>(3, static_cast<size_t>(at));
-    const double t = at - static_cast<double>(low);
-    std::array<int, 3> rgb{};
-    for (size_t c = 0; c < 3; ++c)
-        rgb[c] = static_cast<int>(std::lround(stops[low][c] + t * (stops[low + 1][c] - stops[low][c])));
-    dark = at >= 1.8;
-    DisplayColour colour;
-    colour.rgb = rgb;
-    return colour.hex();
-}
-
 std::string errorMap(const ModelCheck& model)
 {
     const std::vector<CheckedPatch>& check = model.patches;
@@ -331,6 +312,23 @@ std::string worstTable(const std::vector<CheckedPatch>& check, const std::vector
 }
 
 } // namespace
+
+// Viridis, light (small differences) to dark (4 and above): safe for
+// colour-blind readers and still ordered in grey.
+std::string heatColour(double value, bool& dark)
+{
+    static const int stops[5][3] = {{253, 231, 37}, {94, 201, 98}, {33, 145, 140}, {59, 82, 139}, {68, 1, 84}};
+    const double at = std::min(std::max(value, 0.0), 4.0);
+    const size_t low = std::min<size_t>(3, static_cast<size_t>(at));
+    const double t = at - static_cast<double>(low);
+    std::array<int, 3> rgb{};
+    for (size_t c = 0; c < 3; ++c)
+        rgb[c] = static_cast<int>(std::lround(stops[low][c] + t * (stops[low + 1][c] - stops[low][c])));
+    dark = at >= 1.8;
+    DisplayColour colour;
+    colour.rgb = rgb;
+    return colour.hex();
+}
 
 std::string checkSection(const ChartResult& result)
 {

@@ -50,6 +50,11 @@ std::string labText(const Lab& lab);
 
 std::string checkSection(const ChartResult& result);
 
+// The colour of a CIEDE2000 value on the error maps' scale (viridis, light
+// for small differences, dark for 4 and above); `dark` says that text on it
+// should be white.
+std::string heatColour(double value, bool& dark);
+
 } // namespace veltmarquist::html
 
 #endif // VELTMARQUIST_TOOL_HTMLSECTIONS_H
