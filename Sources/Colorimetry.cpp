@@ -126,12 +126,13 @@ double defaultNormFactor()
 
 void spectrumToXYZ(const double* spectrum, double normFactor, double* XYZ)
 {
-    for (int column = 0; column < 3; ++column) {
-        double sum = 0.0;
-        for (int band = 0; band < MathProfile::kBands; ++band)
-            sum += spectrum[band] * MathProfile::Gewichtsfaktoren_XYZ_D50[band][column];
-        XYZ[column] = sum * normFactor;
-    }
+    // The three sums side by side, each still added band by band from 380 nm.
+    double sum[3] = {0.0, 0.0, 0.0};
+    for (int band = 0; band < MathProfile::kBands; ++band)
+        for (int column = 0; column < 3; ++column)
+            sum[column] += spectrum[band] * MathProfile::Gewichtsfaktoren_XYZ_D50[band][column];
+    for (int column = 0; column < 3; ++column)
+        XYZ[column] = sum[column] * normFactor;
 }
 
 double iccF(double t)

@@ -322,14 +322,16 @@ namespace {
 VELTMARQUIST_LANE_LOOP
 void neugebauerSum(const double (&weight)[kPrimaries], const std::array<Bands, kPrimaries>& root, double (&sum)[kBands])
 {
-    for (int band = 0; band < kBands; ++band)
-        sum[band] = 0.0;
+    // A local sum, which nothing else can alias, stays in registers.
+    double local[kBands] = {};
     for (int b = 0; b < kPrimaries; ++b) {
         const double w = weight[b];
         const double* r = root[static_cast<size_t>(b)].data();
         for (int band = 0; band < kBands; ++band)
-            sum[band] += w * r[band];
+            local[band] += w * r[band];
     }
+    for (int band = 0; band < kBands; ++band)
+        sum[band] = local[band];
 }
 
 } // namespace
