@@ -115,7 +115,8 @@ Command setupChartCommand(CLI::App& app)
                 runAndRender<ChartResult>([&](ChartResult& result) { runChart(options->job, result); },
                                           options->style.pick<ChartResult>(renderChart, jsonChart),
                                           report);
-            }};
+            },
+            {}};
 }
 
 } // namespace veltmarquist

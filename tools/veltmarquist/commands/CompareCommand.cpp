@@ -102,7 +102,8 @@ Command setupCompareCommand(CLI::App& app)
                 options->job.read = options->scale.readOptions();
                 runAndRender<CompareResult>([&](CompareResult& result) { runCompare(options->job, result); },
                                             options->style.pick<CompareResult>(renderCompare, jsonCompare), report);
-            }};
+            },
+            {}};
 }
 
 } // namespace veltmarquist

@@ -176,7 +176,8 @@ Command setupConvertCommand(CLI::App& app)
                 runAndRender<ConvertResult>([&](ConvertResult& result) { runConvert(job, result); },
                                             options->style.pick<ConvertResult>(renderConvert, jsonConvert),
                                             report);
-            }};
+            },
+            {}};
 }
 
 } // namespace veltmarquist

@@ -182,7 +182,8 @@ Command setupMultiChannelCommand(CLI::App& app)
                     [&](MultiChannelResult& result) { runMultiChannel(options->job, result); },
                     options->style.pick<MultiChannelResult>(renderMultiChannel, jsonMultiChannel),
                     report);
-            }};
+            },
+            {}};
 }
 
 } // namespace veltmarquist

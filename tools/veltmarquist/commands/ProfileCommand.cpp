@@ -157,7 +157,8 @@ Command setupProfileCommand(CLI::App& app)
                 job.quiet = options->style.quiet || options->style.json;
                 runAndRender<ProfileResult>([&](ProfileResult& result) { runProfile(job, result); },
                                             options->style.pick<ProfileResult>(renderProfile, jsonProfile), report);
-            }};
+            },
+            {}};
 }
 
 } // namespace veltmarquist

@@ -64,7 +64,8 @@ Command setupReportCommand(CLI::App& app)
                 job.read = options->scale.readOptions();
                 runAndRender<ChartResult>([&](ChartResult& result) { runChart(job, result); },
                                           options->style.pick<ChartResult>(renderChart, jsonReport), report);
-            }};
+            },
+            {}};
 }
 
 } // namespace veltmarquist
