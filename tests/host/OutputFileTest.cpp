@@ -117,3 +117,31 @@ TEST(OutputFile, ChartsWithNonFiniteOrMissingDataNeverReplaceTheTarget)
         EXPECT_EQ(entries(dir.dir()), 1);
     }
 }
+
+TEST(OutputFile, AStreamThatFailsHalfwayLeavesTheTargetAsItWas)
+{
+    // An export streams its rows; a value it refuses part of the way through
+    // throws with half a chart in the temporary file, which must vanish.
+    ts::TempDir dir;
+    std::ofstream(dir.path("c.txt")) << "old chart\n";
+    try {
+        PendingOutput output(dir.path("c.txt"));
+        output.writeStreamed([](std::ostream& out) {
+            out << "CTI3\nBEGIN_DATA\n";
+            for (int row = 0; row < 1000; ++row)
+                out << row << "\t0.5\n";
+            throw HostError(Failure::Calculation, "the model predicted a value that is not a number for patch 1001");
+        });
+        output.commit();
+        ADD_FAILURE() << "committed";
+    } catch (const HostError& error) {
+        EXPECT_EQ(error.failure(), Failure::Calculation);
+    }
+    EXPECT_EQ(ts::readFile(dir.path("c.txt")), "old chart\n");
+    EXPECT_EQ(entries(dir.dir()), 1) << "no temporary file left";
+    // A stream that completes is delivered whole.
+    PendingOutput output(dir.path("c.txt"));
+    output.writeStreamed([](std::ostream& out) { out << "new chart\n"; });
+    output.commit();
+    EXPECT_EQ(ts::readFile(dir.path("c.txt")), "new chart\n");
+}
