@@ -19,8 +19,6 @@ namespace veltmarquist::conformance {
 
 namespace {
 
-constexpr double kD50[3] = {96.422, 100.0, 82.521};
-
 Lab labOfD50(double X, double Y, double Z)
 {
     return labOfXYZ({X, Y, Z});
@@ -55,12 +53,8 @@ double number(std::string_view cell, const std::string& where)
 // magenta and black on Y, yellow on Z.
 double channelOf(const Lab& lab, int ink)
 {
-    // CIELAB back to X, Y, Z (D50) on the 0..100 scale.
-    const double fy = (lab.L + 16.0) / 116.0, fx = fy + lab.a / 500.0, fz = fy - lab.b / 200.0;
-    const auto inverse = [](double f) { return f > 6.0 / 29.0 ? f * f * f : 3.0 * (6.0 / 29.0) * (6.0 / 29.0) * (f - 4.0 / 29.0); };
-    const double XYZ[3] = {kD50[0] * inverse(fx), kD50[1] * inverse(fy), kD50[2] * inverse(fz)};
-    static const int channel[4] = {0, 1, 2, 1};
-    return XYZ[channel[ink]];
+    static const size_t channel[4] = {0, 1, 2, 1};
+    return XYZOfLab(lab)[channel[ink]];
 }
 
 // Murray-Davies tone value increase in percent on the ink's channel.

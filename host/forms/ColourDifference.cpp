@@ -15,6 +15,14 @@ Lab labOfXYZ(const Triple& XYZ)
     return Lab{lab.L, lab.a, lab.b};
 }
 
+Triple XYZOfLab(const Lab& lab)
+{
+    const cmsCIELab value{lab.L, lab.a, lab.b};
+    cmsCIEXYZ xyz;
+    cmsLab2XYZ(cmsD50_XYZ(), &xyz, &value);
+    return {xyz.X * 100.0, xyz.Y * 100.0, xyz.Z * 100.0};
+}
+
 double deltaEab(const Lab& first, const Lab& second)
 {
     const cmsCIELab a{first.L, first.a, first.b}, b{second.L, second.a, second.b};

@@ -17,6 +17,8 @@ struct Lab {
 
 // CIELAB (D50) of X, Y, Z on the 0..100 scale.
 Lab labOfXYZ(const Triple& XYZ);
+// X, Y, Z (D50, 0..100) of a CIELAB colour, the inverse of labOfXYZ.
+Triple XYZOfLab(const Lab& lab);
 double deltaEab(const Lab& first, const Lab& second);
 double deltaE2000(const Lab& first, const Lab& second);
 

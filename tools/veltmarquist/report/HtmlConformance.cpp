@@ -16,16 +16,6 @@ namespace {
 
 using namespace html;
 
-// X, Y, Z (D50, 0..100) of a CIELAB colour, for its swatch.
-Triple XYZOfLab(const Lab& lab)
-{
-    const double fy = (lab.L + 16.0) / 116.0, fx = fy + lab.a / 500.0, fz = fy - lab.b / 200.0;
-    const auto inverse = [](double f) {
-        return f > 6.0 / 29.0 ? f * f * f : 3.0 * (6.0 / 29.0) * (6.0 / 29.0) * (f - 4.0 / 29.0);
-    };
-    return {96.422 * inverse(fx), 100.0 * inverse(fy), 82.521 * inverse(fz)};
-}
-
 std::string verdictCell(bool pass)
 {
     return pass ? "<span class=\"pass\">pass</span>" : "<strong class=\"fail\">FAIL</strong>";
