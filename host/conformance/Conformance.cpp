@@ -284,6 +284,22 @@ std::vector<std::string> conditionMismatches(const MeasurementFile& measured, co
     return mismatches;
 }
 
+std::vector<std::string> checkConditions(const MeasurementFile& measured, const Reference& reference,
+                                         bool anyCondition)
+{
+    const std::vector<std::string> mismatches = conditionMismatches(measured, reference);
+    std::string reasons;
+    std::vector<std::string> notes;
+    for (const std::string& mismatch : mismatches) {
+        reasons += (reasons.empty() ? "" : "; ") + mismatch;
+        notes.push_back("compared although they differ: " + mismatch);
+    }
+    if (!mismatches.empty() && !anyCondition)
+        throw HostError(Failure::Usage, "the form and the reference were measured differently (" + reasons +
+                                            "): their colours do not compare; --any-condition compares them anyway");
+    return notes;
+}
+
 bool ConformanceResult::pass() const
 {
     return std::all_of(controls.begin(), controls.end(), [](const ControlPatch& p) { return p.pass; }) &&

@@ -106,6 +106,10 @@ struct GamutComparison {
 // Why two files' measurement conditions differ ("measurement condition M1
 // against M0"), empty when they agree or one does not say.
 std::vector<std::string> conditionMismatches(const MeasurementFile& measured, const Reference& reference);
+// The mismatches refused (Failure::Usage naming them and the way to compare
+// anyway) unless `anyCondition`; then the notes to show with the result.
+std::vector<std::string> checkConditions(const MeasurementFile& measured, const Reference& reference,
+                                         bool anyCondition);
 
 struct ConformanceResult {
     std::vector<ControlPatch> controls;

@@ -64,6 +64,10 @@ void bindMultiChannel(py::module_& module);
 
 void bindConvert(py::module_& module);
 
+// ---- conformance: the press against a reference printing condition -------------------------
+
+void bindConformance(py::module_& module);
+
 } // namespace veltmarquist::python
 
 #endif // VELTMARQUIST_PYTHON_BINDINGS_H

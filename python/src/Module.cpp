@@ -105,6 +105,7 @@ PYBIND11_MODULE(_veltmarquist, module)
     bindModel(module);
     bindMultiChannel(module);
     bindConvert(module);
+    bindConformance(module);
 
     module.def("spectra_to_xyz", &spectraToXYZ, py::arg("spectra"), R"(
 X, Y, Z (D50, 2 degree, 0-100) of spectra (..., 36: reflectance 0-1 at

@@ -317,3 +317,24 @@ def test_no_call_writes_over_a_file_it_read(tmp_path):
             call()
     assert form.read_bytes() == (SAMPLES / "offset_form.txt").read_bytes()
     assert seven.read_bytes() == (SAMPLES / "seven_ink_form.txt").read_bytes()
+
+
+def test_conformance_of_a_sheet_against_itself_and_against_another_condition(tmp_path):
+    sheet = SAMPLES / "offset_press_sheet.txt"
+    result = veltmarquist.conformance(sheet, sheet)
+    assert result["verdict"] == "PASS" and result["passed"]
+    assert [c["delta_e_2000"] for c in result["controls"]] == [0.0] * 12
+    assert {c["tolerance_source"] for c in result["controls"]} == {
+        "ISO 12647-2:2013, as cited in TAGA 2015", "this project's default"}
+    assert len(result["tone_value_increase"]) == 28
+    assert result["gamut"]["regions"]["all"]["count"] > 200
+    # A reference measured under M2 while the form says M1: refused unless asked for.
+    text = sheet.read_text()
+    form = tmp_path / "m1.txt"
+    form.write_text(text.replace("\n", "\nFILTER\t\"M1\"\n", 1))
+    reference = tmp_path / "m2.txt"
+    reference.write_text(text.replace("\n", "\nFILTER\t\"M2\"\n", 1))
+    with pytest.raises(veltmarquist.UsageError, match="measurement condition M1 against the reference's M2"):
+        veltmarquist.conformance(form, reference, gamut=False)
+    allowed = veltmarquist.conformance(form, reference, any_condition=True, gamut=False)
+    assert allowed["gamut"] is None and allowed["conditions"]

@@ -19,7 +19,7 @@ from ._errors import (CalculationError, ContentError, CoverageScaleWarning, Dupl
                       UsageError)
 from ._results import Conversion, Prediction, Profile
 from ._veltmarquist import (CheckResult, Measurements, Model, MultiChannelChart, Summary, chart_xyz,
-                            convert_chart, delta_e_2000, delta_e_ab, fit, multichannel_chart,
+                            conformance, convert_chart, delta_e_2000, delta_e_ab, fit, multichannel_chart,
                             read_measurements, spectra_to_xyz, xyz_to_lab)
 
 __version__ = "1.0.0"
@@ -28,6 +28,6 @@ __all__ = [
     "CalculationError", "CheckResult", "ContentError", "Conversion", "CoverageScaleWarning", "DuplicatePatchError",
     "Error", "FileFormatError", "Measurements", "MissingFileError", "MissingPatchError", "Model",
     "MultiChannelChart", "OutputError", "Prediction", "Profile", "Summary", "UnreadableFileError", "UsageError",
-    "chart_xyz", "convert_chart", "delta_e_2000", "delta_e_ab", "fit", "multichannel_chart",
+    "chart_xyz", "conformance", "convert_chart", "delta_e_2000", "delta_e_ab", "fit", "multichannel_chart",
     "read_measurements", "spectra_to_xyz", "xyz_to_lab",
 ]

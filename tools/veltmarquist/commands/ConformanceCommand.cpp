@@ -33,16 +33,7 @@ void runConformance(const ConformanceJob& job, ConformanceRun& run)
         job.tolerances.empty() ? conformance::Tolerances{} : conformance::readTolerances(job.tolerances);
     run.form = readTestForm(job.form, job.read, run.formWarnings);
     run.reference = conformance::readReference(referencePath);
-    const std::vector<std::string> mismatches = conformance::conditionMismatches(run.form->file, *run.reference);
-    if (!mismatches.empty() && !job.anyCondition) {
-        std::string reasons;
-        for (const std::string& mismatch : mismatches)
-            reasons += (reasons.empty() ? "" : "; ") + mismatch;
-        throw HostError(Failure::Usage, "the form and the reference were measured differently (" + reasons +
-                                            "): their colours do not compare; --any-condition compares them anyway");
-    }
-    for (const std::string& mismatch : mismatches)
-        run.conditions.push_back("compared although they differ: " + mismatch);
+    run.conditions = conformance::checkConditions(run.form->file, *run.reference, job.anyCondition);
     std::optional<PendingOutput> report;
     if (!job.report.empty())
         report.emplace(job.report);
