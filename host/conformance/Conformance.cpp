@@ -24,14 +24,8 @@ Lab labOfD50(double X, double Y, double Z)
     return labOfXYZ({X, Y, Z});
 }
 
-// Whole tenths of a percent, as the form's patches are matched.
-std::array<long, 4> keyOf(const Cmyk& cmyk)
-{
-    std::array<long, 4> key{};
-    for (size_t i = 0; i < 4; ++i)
-        key[i] = std::lround(cmyk[i] * 10.0);
-    return key;
-}
+// Combinations are matched as the form's patches are: whole tenths of a percent.
+using Key = CombinationIndex::Key;
 
 std::string fileName(const std::string& path)
 {
@@ -84,9 +78,9 @@ double hueDifference(const Lab& a, const Lab& b)
 
 std::optional<Lab> Reference::find(const Cmyk& wanted) const
 {
-    const auto key = keyOf(wanted);
+    const auto key = CombinationIndex::keyOf(wanted);
     for (size_t i = 0; i < cmyk.size(); ++i)
-        if (keyOf(cmyk[i]) == key)
+        if (CombinationIndex::keyOf(cmyk[i]) == key)
             return lab[i];
     return std::nullopt;
 }
@@ -124,7 +118,7 @@ Reference readReference(const std::string& path)
     const cgats::Keyword* descriptor = table.header.find("DESCRIPTOR");
     reference.description = descriptor && !descriptor->value.empty() ? descriptor->value : fileName(path);
 
-    std::map<std::array<long, 4>, std::pair<size_t, std::array<double, 3>>> sums; // count, L a b sums
+    std::map<Key, std::pair<size_t, std::array<double, 3>>> sums; // count, L a b sums
     std::vector<Cmyk> order;
     // Spectra first, through the same colorimetry as the form's (a file
     // compared with itself then differs by nothing); else the stated colours.
@@ -140,7 +134,7 @@ Reference readReference(const std::string& path)
                                          number(row[static_cast<size_t>(B)], where)}
                                    : labOfD50(number(row[static_cast<size_t>(X)], where), number(row[static_cast<size_t>(Y)], where),
                                               number(row[static_cast<size_t>(Z)], where));
-            auto& [count, sum] = sums[keyOf(cmyk)];
+            auto& [count, sum] = sums[CombinationIndex::keyOf(cmyk)];
             if (count++ == 0)
                 order.push_back(cmyk);
             sum[0] += lab.L, sum[1] += lab.a, sum[2] += lab.b;
@@ -151,27 +145,27 @@ Reference readReference(const std::string& path)
                                                                           "XYZ_X..XYZ_Z or spectral fields");
         const MeasurementFile& file = *spectral.file;
         // Repeats averaged as spectra, as the form's patches are.
-        std::map<std::array<long, 4>, std::vector<size_t>> groups;
+        std::map<Key, std::vector<size_t>> groups;
         for (size_t i = 0; i < file.sets.size(); ++i) {
             Cmyk cmyk{};
             for (size_t ink = 0; ink < 4; ++ink)
                 cmyk[ink] = static_cast<double>(file.sets[i].device[ink]) / kDeviceUnits;
-            std::vector<size_t>& group = groups[keyOf(cmyk)];
+            std::vector<size_t>& group = groups[CombinationIndex::keyOf(cmyk)];
             if (group.empty())
                 order.push_back(cmyk);
             group.push_back(i);
         }
         for (const Cmyk& cmyk : order) {
-            const std::vector<size_t>& group = groups[keyOf(cmyk)];
+            const std::vector<size_t>& group = groups[CombinationIndex::keyOf(cmyk)];
             const std::vector<int> thousandths = averageThousandths(file, group);
             const Lab lab = labOfXYZ(XYZOfBands(libraryBands({&file.layout, &thousandths})));
-            sums[keyOf(cmyk)] = {1, {lab.L, lab.a, lab.b}};
+            sums[CombinationIndex::keyOf(cmyk)] = {1, {lab.L, lab.a, lab.b}};
         }
     }
     if (order.empty())
         throw HostError(Failure::InputContent, escapeControls(path) + ": the reference holds no patch");
     for (const Cmyk& cmyk : order) {
-        const auto& [count, sum] = sums[keyOf(cmyk)];
+        const auto& [count, sum] = sums[CombinationIndex::keyOf(cmyk)];
         reference.cmyk.push_back(cmyk);
         reference.lab.push_back({sum[0] / count, sum[1] / count, sum[2] / count});
     }
@@ -300,10 +294,16 @@ std::vector<std::string> checkConditions(const MeasurementFile& measured, const 
     return notes;
 }
 
+int ConformanceResult::failures() const
+{
+    return static_cast<int>(
+        std::count_if(controls.begin(), controls.end(), [](const ControlPatch& p) { return !p.pass; }) +
+        std::count_if(toneValues.begin(), toneValues.end(), [](const ToneValuePoint& p) { return !p.pass; }));
+}
+
 bool ConformanceResult::pass() const
 {
-    return std::all_of(controls.begin(), controls.end(), [](const ControlPatch& p) { return p.pass; }) &&
-           std::all_of(toneValues.begin(), toneValues.end(), [](const ToneValuePoint& p) { return p.pass; });
+    return failures() == 0;
 }
 
 ConformanceResult compare(const FoundForm& form, const Reference& reference, const Tolerances& given,
@@ -312,10 +312,10 @@ ConformanceResult compare(const FoundForm& form, const Reference& reference, con
     Tolerances tolerances = given;
     ConformanceResult result;
     const MeasuredForm measuredForm = form.measuredForm();
-    std::map<std::array<long, 4>, Lab> measured;
+    std::map<Key, Lab> measured;
     for (int patch = 0; patch < MeasuredForm::kPatches; ++patch) {
         const Spectrum& spectrum = measuredForm.spectrum(patch);
-        measured[keyOf(MeasuredForm::coverageOf(patch))] =
+        measured[CombinationIndex::keyOf(MeasuredForm::coverageOf(patch))] =
             labOfXYZ(XYZOfBands(std::vector<double>(spectrum.begin(), spectrum.end())));
     }
     const struct {
@@ -333,7 +333,7 @@ ConformanceResult compare(const FoundForm& form, const Reference& reference, con
         {"grey C40 M40 Y40 K40", "grey", {40, 40, 40, 40}, false},
     };
     for (const auto& control : controls) {
-        const auto ours = measured.find(keyOf(control.cmyk));
+        const auto ours = measured.find(CombinationIndex::keyOf(control.cmyk));
         const std::optional<Lab> theirs = reference.find(control.cmyk);
         if (ours == measured.end() || !theirs) {
             result.absent.push_back(control.name);
@@ -357,8 +357,8 @@ ConformanceResult compare(const FoundForm& form, const Reference& reference, con
     // Tone value increase at the form's tints of each ink.
     const std::optional<Lab> referencePaper = reference.find({0, 0, 0, 0});
     for (int ink = 0; ink < 4; ++ink) {
-        const auto paper = measured.find(keyOf({0, 0, 0, 0}));
-        const auto solid = measured.find(keyOf(single(ink, 100)));
+        const auto paper = measured.find(CombinationIndex::keyOf(Cmyk{0, 0, 0, 0}));
+        const auto solid = measured.find(CombinationIndex::keyOf(single(ink, 100)));
         const std::optional<Lab> referenceSolid = reference.find(single(ink, 100));
         if (!referencePaper || !referenceSolid || paper == measured.end() || solid == measured.end())
             continue;

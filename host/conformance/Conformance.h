@@ -118,6 +118,9 @@ struct ConformanceResult {
     std::optional<GamutComparison> gamut;
     std::vector<std::string> conditionNotes; // mismatches allowed by the user, or conditions not stated
     bool pass() const;
+    // Control patches and tone values checked, and how many of them fail.
+    int checks() const { return static_cast<int>(controls.size() + toneValues.size()); }
+    int failures() const;
 };
 
 // Compares the form with the reference. `model` (fitted to the form)

@@ -10,7 +10,6 @@
 #include <cctype>
 #include <cmath>
 #include <cstdlib>
-#include <map>
 #include <memory>
 #include <sstream>
 #include <vector>
@@ -152,10 +151,9 @@ std::string cgatsOfCxf3(const std::string& xml, const std::string& name)
     if (objects.empty())
         document.fail(xmlGetLineNo(resources ? resources : root), "no <cc:Object> in a <cc:ObjectCollection>");
 
-    // Colour specifications by Id: their wavelength ranges.
-    std::map<std::string, Node> specifications;
-    for (Node specification : children(child(resources, "ColorSpecificationCollection"), "ColorSpecification"))
-        specifications[attribute(specification, "Id")] = specification;
+    // The file's wavelength range: where a spectrum states no start of its own,
+    // and the step of every spectrum (all must share one start and length).
+    const Node range = descendant(resources, "WavelengthRange");
 
     struct Row {
         std::string id;
@@ -170,12 +168,11 @@ std::string cgatsOfCxf3(const std::string& xml, const std::string& name)
         const Node spectrum = descendant(child(object, "ColorValues"), "ReflectanceSpectrum");
         if (!spectrum)
             document.failAt(object, "no <cc:ReflectanceSpectrum> among its colour values");
-        const Node range = descendant(specifications[attribute(spectrum, "ColorSpecification")], "WavelengthRange");
         const std::string given = attribute(spectrum, "StartWL").empty() ? attribute(range, "StartWL")
                                                                          : attribute(spectrum, "StartWL");
         const std::string increment = attribute(range, "Increment");
         if (!isNumber(given))
-            document.failAt(spectrum, "no start wavelength (StartWL here or in its colour specification)");
+            document.failAt(spectrum, "no start wavelength (StartWL here or on the file's <cc:WavelengthRange>)");
         const long objectStart = std::lround(std::strtod(given.c_str(), nullptr));
         const long objectStep = isNumber(increment) ? std::lround(std::strtod(increment.c_str(), nullptr)) : 10;
         std::istringstream values(textOf(spectrum));
@@ -233,18 +230,18 @@ std::string cgatsOfCxf3(const std::string& xml, const std::string& name)
     for (const auto& [keyword, value] : keywords)
         if (!value.empty())
             text += std::string(keyword) + "\t\"" + keywordValue(value) + "\"\n";
-    // A measurement condition wherever the measurement spec names one.
-    for (const char* element : {"MeasurementCondition", "Filter", "MeasurementMode"}) {
-        const std::string value = textOf(descendant(resources, element));
-        for (const char* mode : {"M0", "M1", "M2", "M3"})
-            if (value.find(mode) != std::string::npos) {
-                text += std::string("MEASUREMENT_CONDITION\t\"") + mode + "\"\n";
-                element = nullptr;
-                break;
-            }
-        if (!element)
-            break;
-    }
+    // A measurement condition (M0 to M3) under the first of these elements that names one.
+    const auto condition = [&]() -> std::string {
+        for (const char* element : {"MeasurementCondition", "Filter", "MeasurementMode"}) {
+            const std::string value = textOf(descendant(resources, element));
+            for (const char* mode : {"M0", "M1", "M2", "M3"})
+                if (value.find(mode) != std::string::npos)
+                    return mode;
+        }
+        return "";
+    }();
+    if (!condition.empty())
+        text += "MEASUREMENT_CONDITION\t\"" + condition + "\"\n";
     text += "BEGIN_DATA_FORMAT\nSAMPLE_ID";
     if (inks == 4) {
         text += "\tCMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K";

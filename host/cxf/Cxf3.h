@@ -4,15 +4,15 @@
 // give the same sets, the same fit and the same chart bytes.
 //
 // Read: every cc:Object of the cc:ObjectCollection with a
-// cc:ReflectanceSpectrum (its StartWL, else its colour specification's
-// cc:WavelengthRange StartWL; the Increment of that range, else 10 nm) and
+// cc:ReflectanceSpectrum (its StartWL, else the StartWL of the file's
+// cc:WavelengthRange; the Increment of that range, else 10 nm) and
 // a cc:ColorCMYK (Cyan, Magenta, Yellow, Black) or cc:ColorCMYKPlusN (the
 // four, then each further ink in document order) among its device values.
 // Numbers are copied as written. The header keeps what the file says of its
 // origin and measurement: DESCRIPTOR (cc:Description), ORIGINATOR
 // (cc:Creator), CREATED (cc:CreationDate), INSTRUMENTATION (the device's
 // cc:Model), ILLUMINATION_NAME and OBSERVER_ANGLE (cc:TristimulusSpec) and
-// MEASUREMENT_CONDITION (M0 to M3, where the measurement spec names one).
+// MEASUREMENT_CONDITION (M0 to M3, where the file's measurement set-up names one).
 // Namespace prefixes do not matter; elements are known by their local names.
 #ifndef VELTMARQUIST_CXF_CXF3_H
 #define VELTMARQUIST_CXF_CXF3_H

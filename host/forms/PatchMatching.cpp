@@ -127,6 +127,11 @@ CombinationIndex::Key CombinationIndex::keyOf(const std::vector<double>& device)
     return key;
 }
 
+CombinationIndex::Key CombinationIndex::keyOf(const Cmyk& cmyk)
+{
+    return keyOf(std::vector<double>(cmyk.begin(), cmyk.end()));
+}
+
 CombinationIndex::Key CombinationIndex::keyOf(const MeasurementSet& set)
 {
     Key key{};

@@ -9,6 +9,7 @@
 #define VELTMARQUIST_FORMS_PATCHMATCHING_H
 
 #include "MeasurementFile.h"
+#include "models/PrintModels.h"
 
 #include <array>
 #include <cstdint>
@@ -70,6 +71,7 @@ public:
     // a C, M, Y, K request finds a seven-channel set whose further inks are 0.
     static Key keyOf(const std::vector<double>& device);
     static Key keyOf(const MeasurementSet& set);
+    static Key keyOf(const Cmyk& cmyk);
 
 private:
     struct KeyHash {

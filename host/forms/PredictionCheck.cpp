@@ -14,10 +14,6 @@ namespace {
 
 using Key = CombinationIndex::Key;
 
-Key keyOf(const Cmyk& cmyk)
-{
-    return CombinationIndex::keyOf(std::vector<double>(cmyk.begin(), cmyk.end()));
-}
 
 // One batch of predictions: the X, Y, Z (N = 3) or the spectra (N = 36).
 template <size_t N>
@@ -64,15 +60,15 @@ std::vector<CheckedPatch> checkPredictions(const MeasurementFile& file, const st
 {
     std::set<Key> skip, chart;
     for (int patch = 0; patch < MeasuredForm::kPatches; ++patch)
-        skip.insert(keyOf(MeasuredForm::coverageOf(patch)));
+        skip.insert(CombinationIndex::keyOf(MeasuredForm::coverageOf(patch)));
     for (const Cmyk& cmyk : characterisationChart())
-        chart.insert(keyOf(cmyk));
+        chart.insert(CombinationIndex::keyOf(cmyk));
     const CombinationIndex measured(file);
     std::vector<Cmyk> found;
     std::vector<Triple> measuredXYZ;
     for (const Cmyk& coverage : coverages) {
         const SetList sets = measured.find(std::vector<double>(coverage.begin(), coverage.end()));
-        if (sets.empty() || !skip.insert(keyOf(coverage)).second)
+        if (sets.empty() || !skip.insert(CombinationIndex::keyOf(coverage)).second)
             continue;
         const std::vector<int> thousandths = averageThousandths(file, sets.begin(), sets.size());
         found.push_back(coverage);
@@ -82,7 +78,7 @@ std::vector<CheckedPatch> checkPredictions(const MeasurementFile& file, const st
     std::vector<CheckedPatch> checked;
     for (size_t i = 0; i < found.size(); ++i) {
         checked.push_back(checkedPatch(found[i], measuredXYZ[i], chartXYZ(predicted[i])));
-        checked.back().onChart = chart.count(keyOf(found[i])) > 0;
+        checked.back().onChart = chart.count(CombinationIndex::keyOf(found[i])) > 0;
     }
     return checked;
 }
@@ -141,7 +137,7 @@ ModelCheck checkModel(const MeasurementFile& file, const PrintModel& model)
     check.model = model.name();
     std::set<Key> form, seen;
     for (int patch = 0; patch < MeasuredForm::kPatches; ++patch)
-        form.insert(keyOf(MeasuredForm::coverageOf(patch)));
+        form.insert(CombinationIndex::keyOf(MeasuredForm::coverageOf(patch)));
     const CombinationIndex index(file);
     const auto predicted = [&](double coverage) {
         return check.levels.empty() || std::find(check.levels.begin(), check.levels.end(), coverage) != check.levels.end();

@@ -168,11 +168,7 @@ std::string gamutSection(const conformance::GamutComparison& gamut, std::size_t 
 std::string conformanceReport(const ConformanceRun& run)
 {
     const conformance::ConformanceResult& result = *run.result;
-    int checks = 0, failed = 0;
-    for (const auto& patch : result.controls)
-        ++checks, failed += patch.pass ? 0 : 1;
-    for (const auto& point : result.toneValues)
-        ++checks, failed += point.pass ? 0 : 1;
+    const int checks = result.checks(), failed = result.failures();
     std::vector<std::pair<std::string, std::string>> sections = {
         {"summary", "Summary"}, {"controls", "Control patches"}, {"tone-values", "Tone values"}};
     if (result.gamut)

@@ -236,10 +236,7 @@ void renderConformance(const ConformanceRun& run, std::ostream& out)
         return fixed(value.L, 1) + " " + fixed(value.a, 1) + " " + fixed(value.b, 1);
     };
     out << "control patches: measured L* a* b* | reference | dE00 | dE*ab | dH*ab | tolerance (dE00, source)\n";
-    int failed = 0, checked = 0;
     for (const conformance::ControlPatch& patch : result.controls) {
-        ++checked;
-        failed += patch.pass ? 0 : 1;
         std::string name = patch.name;
         name.resize(std::max<size_t>(name.size(), 21), ' ');
         out << "  " << name << " " << lab(patch.measured) << " | " << lab(patch.reference) << " | "
@@ -259,8 +256,6 @@ void renderConformance(const ConformanceRun& run, std::ostream& out)
             for (const conformance::ToneValuePoint& point : result.toneValues) {
                 if (point.ink != ink)
                     continue;
-                ++checked;
-                failed += point.pass ? 0 : 1;
                 line += "  " + shortText(point.nominal) + " % " + signedFixedText(point.measured, 1) + "/" +
                         signedFixedText(point.reference, 1) + (point.interpolated ? "*" : "") + (point.pass ? "" : " FAIL");
             }
@@ -268,7 +263,8 @@ void renderConformance(const ConformanceRun& run, std::ostream& out)
                 out << "  " << inks[ink] << ":" << line << "\n";
         }
     }
-    out << "verdict: " << (result.pass() ? "PASS" : "FAIL") << " (" << checked - failed << " of " << checked
+    out << "verdict: " << (result.pass() ? "PASS" : "FAIL") << " (" << result.checks() - result.failures() << " of "
+        << result.checks()
         << " checks within tolerance)\n";
     if (!result.gamut)
         return;
