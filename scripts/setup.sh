@@ -6,9 +6,9 @@ set -euo pipefail
 packages=(build-essential cmake ninja-build pkg-config
           libgtest-dev libgmock-dev libbenchmark-dev
           liblcms2-dev libcli11-dev
-          argyll-ref icc-profiles-free  # real CGATS files the reader tests read
+          argyll-ref icc-profiles-free  # real CGATS files the reader tests read; FOGRA39L for conformance
           argyll bc  # colprof, profcheck, xicclu, iccdump, spec2cie: profiles checked (stage 60-profile)
-          libxml2-dev  # the HTML report's test parses the page as XML
+          libxml2-dev  # CxF3 measurement files (host tier); the HTML report's test parses the page as XML
           chromium  # renders the HTML report headless (stage 70-report)
           clang libclang-rt-14-dev valgrind python3
           python3-dev python3-venv python3-pip python3-setuptools python3-build python3-wheel  # the Python package
